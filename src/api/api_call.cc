@@ -1,0 +1,126 @@
+#include "api/api_call.h"
+
+#include <cstdio>
+#include <cstring>
+
+namespace quillmere {
+
+api_call::api_call(const char *path, char **error_message)
+    : url_(string_new(256)), error_message_(error_message)
+{
+    *error_message_ = nullptr;
+    string_append(url_.get(), urls[1]);
+    string_append(url_.get(), path);
+}
+
+void api_call::plain(const char *key, const char *value)
+{
+    string_append(url_.get(), key);
+    string_append(url_.get(), value);
+}
+
+void api_call::encoded(const char *key, const char *value)
+{
+    string_append(url_.get(), key);
+    string_append_urlencode(url_.get(), value);
+}
+
+void api_call::secret(const char *key, const char *value)
+{
+    string_append(url_.get(), key);
+    string_append_urlencode_obfs(url_.get(), value);
+}
+
+void api_call::number(const char *key, uint64_t value)
+{
+    string_append(url_.get(), key);
+    string_append_num(url_.get(), value);
+}
+
+void api_call::version() { plain("&version=", api_version); }
+
+void api_call::fetch(const char *url_heading, reply_log log)
+{
+    if (url_heading)
+        qm_printf("%s%s\n", url_heading, string_get_obfs(url_.get(), nullptr));
+
+    char *reply = nullptr;
+    response_code_ =
+        get_response_from_url(string_get(url_.get()), nullptr, 0, &reply, &reply_length_, 0);
+    reply_.reset(reply);
+    log_reply(log);
+}
+
+void api_call::log_reply(reply_log log) const
+{
+    if (log == reply_log::none)
+        return;
+    qm_printf("%s\n%s\n", log == reply_log::response ? "Got response:" : "Got text:", reply_.get());
+    if (log == reply_log::text_and_length)
+        qm_printf("Text len: %lu\n", static_cast<unsigned long>(reply_length_));
+    if (log == reply_log::text_and_int_length)
+        qm_printf("Text len: %d\n", static_cast<int>(reply_length_));
+}
+
+bool api_call::accepted(error_reading reading, exchange_verdict verdict)
+{
+    heap_text result = text_of("result");
+    if (!result) {
+        failed_exchange(verdict);
+        return false;
+    }
+    if (std::strcmp(result.get(), "Success") != 0) {
+        refused(reading);
+        return false;
+    }
+    status_ = QM_OK;
+    return true;
+}
+
+heap_text api_call::text_of(const char *element)
+{
+    int32_t parse_failed = 0;
+    heap_text text(simple_get_xml_node_value(reply_.get(), reply_length_, element, &parse_failed));
+    parse_failures_ += static_cast<uint32_t>(parse_failed);
+    return text;
+}
+
+heap_text api_call::required_text_of(const char *element)
+{
+    heap_text text = text_of(element);
+    if (!text)
+        status_ = QM_UNUSABLE_RESPONSE;
+    return text;
+}
+
+void api_call::refused(error_reading)
+{
+    get_error_from_xml(reply_.get(), reply_length_, &status_, error_message_);
+    if (check_api_error)
+        check_api_error(string_get(url_.get()), reply_.get(), status_, *error_message_);
+}
+
+void api_call::failed_exchange(exchange_verdict verdict)
+{
+    bool no_code = response_code_ < 1;
+    if (verdict == exchange_verdict::silent_unless_zero)
+        no_code = !reply_ && response_code_ == 0;
+    status_ = no_code ? QM_NO_RESPONSE : QM_UNUSABLE_RESPONSE;
+    if (verdict == exchange_verdict::with_message)
+        explain_failed_exchange();
+}
+
+void api_call::explain_failed_exchange()
+{
+    if (status_ == QM_NO_RESPONSE) {
+        *error_message_ = string_dup("Response error: no server HTTP response code received");
+        return;
+    }
+    constexpr size_t message_size = 64;
+    *error_message_ = static_cast<char *>(allocate_zeroed(message_size));
+    std::snprintf(*error_message_, message_size,
+                  "Response error: received server HTTP response code %li",
+                  static_cast<long>(response_code_));
+}
+
+} // namespace quillmere

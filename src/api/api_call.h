@@ -1,0 +1,105 @@
+// The skeleton that every operation runs on. An operation composes its URL, fetches, asks whether
+// the service accepted, looks up what it wants and returns the status; its peculiarities are
+// arguments with names, or plain statements.
+#pragma once
+
+#include "owned.h"
+#include "records/records.h"
+
+namespace quillmere {
+
+// How the reply is logged.
+enum class reply_log {
+    none,
+    text,
+    response, // the same under another heading
+    text_and_length,
+    text_and_int_length, // the length as a signed int
+};
+
+// What a failed exchange amounts to: no reply text, or a reply without a result.
+enum class exchange_verdict {
+    with_message,      // no code or a code, with a message that says so
+    silent,            // the same, without a message
+    silent_unless_zero // without a message; a missing reply with a code below zero counts as one
+                       // with a code
+};
+
+// How the error number and message of a refusal are read.
+enum class error_reading {
+    standard, // get_error_from_xml()
+};
+
+// Ties an element of the reply, a name or a path below the root, to a field.
+template <class Record> struct element_field {
+    const char *element;
+    char *Record::*field;
+};
+
+class api_call {
+public:
+    // Starts the URL with the TLS base and the path, and resets the error message.
+    api_call(const char *path, char **error_message);
+
+    // Each appends a key, with its punctuation, and a value.
+    void plain(const char *key, const char *value);
+    void encoded(const char *key, const char *value);
+    void secret(const char *key, const char *value); // encoded, and left out of the log
+    void number(const char *key, uint64_t value);
+    void version();
+
+    // Logs the URL behind a heading (null: not at all), performs the exchange and logs the reply.
+    void fetch(const char *url_heading, reply_log log);
+
+    bool has_reply() const { return reply_ != nullptr; }
+
+    // Whether the result is "Success". If not, status and error message say why, and the error hook
+    // has been called for a refusal.
+    bool accepted(error_reading reading = error_reading::standard,
+                  exchange_verdict verdict = exchange_verdict::with_message);
+
+    // The text of an element, or null.
+    heap_text text_of(const char *element);
+
+    // As the token that the service must hand out: without it, the reply is of no use.
+    heap_text required_text_of(const char *element);
+
+    // Looks up the elements of a table, in its order, into a record's fields.
+    template <class Record, size_t count>
+    void fill(Record &record, const element_field<Record> (&table)[count])
+    {
+        for (const auto &[element, field] : table)
+            record.*field = text_of(element).release();
+    }
+
+    // A record filled from one table, or null if any lookup of the call failed to parse.
+    template <class Record, size_t count>
+    owned_record<Record> record_of(const element_field<Record> (&table)[count])
+    {
+        auto record = new_record<Record>();
+        fill(*record, table);
+        return malformed() ? nullptr : std::move(record);
+    }
+
+    // Whether any lookup so far failed to parse the reply.
+    bool malformed() const { return parse_failures_ > 0; }
+
+    // What the operation returns. A malformed reply overrides whatever else was found.
+    int32_t status() const { return malformed() ? QM_MALFORMED_REPLY : status_; }
+
+private:
+    void log_reply(reply_log log) const;
+    void refused(error_reading reading);
+    void failed_exchange(exchange_verdict verdict);
+    void explain_failed_exchange();
+
+    owned_buffer url_;
+    char **error_message_;
+    heap_text reply_;
+    uint64_t reply_length_ = 0;
+    int64_t response_code_ = 0;
+    uint32_t parse_failures_ = 0;
+    int32_t status_ = -1;
+};
+
+} // namespace quillmere

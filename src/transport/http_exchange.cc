@@ -1,0 +1,140 @@
+#include "transport/http_exchange.h"
+
+#include <cstring>
+#include <utility>
+
+#include "owned.h"
+#include "runtime/lifecycle.h"
+#include "transport/transfer.h"
+
+namespace quillmere {
+
+const char *critical_error_text = "SSL: SSL_set_session failed: error:140C30F0:SSL "
+                                  "routines:SSL_set_session:unable to find ssl method";
+
+namespace {
+
+// Fixed, whatever the configured base addresses are.
+constexpr size_t shortest_url = 27;
+
+struct http_request {
+    const char *url;
+    const void *body;
+    uint64_t body_length;
+    int64_t timeout_seconds;
+
+    bool is_post() const { return body && body_length != 0; }
+};
+
+bool address(CURL *handle, const http_request &request)
+{
+    return curl_easy_setopt(handle, CURLOPT_URL, request.url) == CURLE_OK &&
+           curl_easy_setopt(handle, CURLOPT_FOLLOWLOCATION, 1L) == CURLE_OK &&
+           curl_easy_setopt(handle, CURLOPT_NOSIGNAL, 1L) == CURLE_OK;
+}
+
+void limit_time(CURL *handle, const http_request &request)
+{
+    int64_t seconds = request.timeout_seconds;
+    if (seconds < 1)
+        seconds = ca_cert_pem_path.default_timeout;
+    curl_easy_setopt(handle, CURLOPT_TIMEOUT, static_cast<long>(seconds));
+}
+
+void send_body(CURL *handle, const http_request &request)
+{
+    if (!request.is_post())
+        return;
+    curl_easy_setopt(handle, CURLOPT_POST, 1L);
+    curl_easy_setopt(handle, CURLOPT_POSTFIELDSIZE, static_cast<long>(request.body_length));
+    curl_easy_setopt(handle, CURLOPT_POSTFIELDS, request.body);
+}
+
+// Sets everything up for one attempt; false if libcurl refuses what the attempt cannot do without.
+bool prepare(CURL *handle, const http_request &request, error_text &error, string_buffer *received)
+{
+    share_dns_cache(handle);
+    curl_easy_setopt(handle, CURLOPT_ERRORBUFFER, error.text);
+    if (!address(handle, request))
+        return false;
+    restrain_redirects(handle);
+    limit_time(handle, request);
+    curl_easy_setopt(handle, CURLOPT_NOPROGRESS, 1L);
+    use_proxy(handle);
+    verify_peer(handle);
+    curl_easy_setopt(handle, CURLOPT_WRITEFUNCTION, curl_write_function);
+    curl_easy_setopt(handle, CURLOPT_WRITEDATA, received);
+    if (ssl_disabled) {
+        curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 0L);
+        curl_easy_setopt(handle, CURLOPT_SSL_VERIFYHOST, 0L);
+    }
+    send_body(handle, request);
+    return true;
+}
+
+void report_failure(CURLcode code, const error_text &error)
+{
+    log_failure(code, error);
+    if (std::strcmp(error.text, critical_error_text) != 0)
+        return;
+    qm_printf("Detected critical error!\n");
+    if (event_handler && event_handler->function)
+        event_handler->function(0, event_handler->argument);
+}
+
+// One attempt: the response code, with the body in received, or -1.
+int64_t attempt(const http_request &request, error_text &error, string_buffer *received)
+{
+    easy_handle handle(curl_easy_init());
+    if (!handle || !prepare(handle.get(), request, error, received))
+        return -1;
+    CURLcode code = curl_easy_perform(handle.get());
+    if (code != CURLE_OK) {
+        report_failure(code, error);
+        return -1;
+    }
+    long response_code = 0;
+    curl_easy_getinfo(handle.get(), CURLINFO_RESPONSE_CODE, &response_code);
+    return response_code;
+}
+
+void hand_over(owned_buffer received, char **response, uint64_t *response_length)
+{
+    *response = received->bytes;
+    *response_length = received->length;
+    string_delete(received.release(), 0);
+}
+
+} // namespace
+
+} // namespace quillmere
+
+using namespace quillmere;
+
+int64_t get_response_from_url(const char *url, const void *body, uint64_t body_length,
+                              char **response, uint64_t *response_length, int64_t timeout_seconds)
+{
+    *response = nullptr;
+    *response_length = 0;
+    if (!url || std::strlen(url) < shortest_url)
+        return -1;
+
+    http_request request = {url, body, body_length, timeout_seconds};
+    error_text error;
+    // Without a pause between attempts, deliberately: how long to wait is for the caller to know.
+    for (int32_t left = ca_cert_pem_path.connection_attempts; left > 0; --left) {
+        owned_buffer received(string_new(0));
+        int64_t response_code = attempt(request, error, received.get());
+        if (response_code >= 0) {
+            hand_over(std::move(received), response, response_length);
+            return response_code;
+        }
+    }
+    return -1;
+}
+
+size_t curl_write_function(char *data, size_t size, size_t count, void *buffer)
+{
+    string_append_len(static_cast<string_buffer *>(buffer), data, size * count);
+    return size * count;
+}

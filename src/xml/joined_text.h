@@ -1,0 +1,20 @@
+// Joins the pieces in which expat delivers a text. It remembers where the text ends and how much
+// room there is, so that a text of many pieces costs no more a byte than one of a single piece.
+#pragma once
+
+#include "quillmere.h"
+
+namespace quillmere {
+
+class joined_text {
+public:
+    // Appends to the value, which must be NULL at first and touched by nobody else between the
+    // appends. It is malloc memory, NUL-terminated after every append.
+    void append(char **value, const char *piece, int length);
+
+private:
+    uint64_t length_ = 0;
+    uint64_t capacity_ = 0;
+};
+
+} // namespace quillmere
