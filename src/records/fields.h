@@ -7,7 +7,10 @@
 
 #include "quillmere.h"
 
+// A field's name and type cannot stand in parentheses.
+// NOLINTBEGIN(bugprone-macro-parentheses)
 // clang-format off
+#define NOTHING
 #define FILE_INFO_FIELDS(FIELD, record, SEP)          \
     FIELD(record, char *, quickkey)               SEP \
     FIELD(record, char *, parent_folderkey)       SEP \
@@ -181,12 +184,13 @@
     FIELD(record, char *, error)
 
 #define STORED_FIELD(record, type, name) type name;
-#define DECLARE_RECORD(record, STORED_FIELDS)                                       \
-    struct record { STORED_FIELDS(STORED_FIELD, record, ) };                        \
-    namespace quillmere {                                                           \
-    inline void delete_record(record *deleted) { record##_delete(&deleted); }       \
+#define DECLARE_RECORD(record, STORED_FIELDS)                                 \
+    struct record { STORED_FIELDS(STORED_FIELD, record, NOTHING) };           \
+    namespace quillmere {                                                     \
+    inline void delete_record(record *deleted) { record##_delete(&deleted); } \
     }
 // clang-format on
+// NOLINTEND(bugprone-macro-parentheses)
 
 DECLARE_RECORD(file_info, FILE_INFO_FIELDS)
 DECLARE_RECORD(folder_info, FOLDER_INFO_STORED_FIELDS)

@@ -31,6 +31,7 @@ void release(int32_t) {}
 
 using namespace quillmere;
 
+// NOLINTBEGIN(bugprone-macro-parentheses): a field's name and type cannot stand in parentheses
 // clang-format off
 #define COMMA ,
 #define ARGUMENT(record, type, name) outside<type> name
@@ -46,18 +47,19 @@ using namespace quillmere;
     record *record##_new(FIELDS(ARGUMENT, record, COMMA)) \
     {                                                     \
         auto self = new_record<record>();                 \
-        FIELDS(KEEP, record, )                            \
+        FIELDS(KEEP, record, NOTHING)                     \
         return self.release();                            \
     }                                                     \
-    FIELDS(GETTER, record, )                              \
+    FIELDS(GETTER, record, NOTHING)                       \
     void record##_delete(record **self)                   \
     {                                                     \
         if (!self || !*self)                              \
             return;                                       \
-        FIELDS(RELEASE, record, )                         \
+        FIELDS(RELEASE, record, NOTHING)                  \
         std::free(*self);                                 \
     }
 // clang-format on
+// NOLINTEND(bugprone-macro-parentheses)
 
 DEFINE_RECORD(file_info, FILE_INFO_FIELDS)
 DEFINE_RECORD(folder_info, FOLDER_INFO_FIELDS)

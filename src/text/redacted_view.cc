@@ -1,4 +1,5 @@
 // The view of a string buffer that may be logged.
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 #include <memory>
@@ -72,8 +73,7 @@ heap_text redacted(const string_buffer &buffer, const char *marker)
     char *out = view.get();
     walk(covers.get(), buffer.length, [&](uint64_t index, bool hidden, bool first) {
         if (first) {
-            std::memcpy(out, marker, marker_length);
-            out += marker_length;
+            out = std::copy_n(marker, marker_length, out);
         } else if (!hidden) {
             *out++ = buffer.bytes[index];
         }

@@ -13,13 +13,15 @@ constexpr long most_redirects = 30;
 
 // Called once a connection stands and before the request goes out: from an encrypted hop on, only
 // encrypted ones may follow.
-extern "C" int keep_encrypted(void *handle, char *, char *, int, int)
+extern "C" {
+static int keep_encrypted(void *handle, char *, char *, int, int)
 {
     const char *scheme = nullptr;
     curl_easy_getinfo(static_cast<CURL *>(handle), CURLINFO_SCHEME, &scheme);
     if (scheme && strcasecmp(scheme, "https") == 0)
         curl_easy_setopt(static_cast<CURL *>(handle), CURLOPT_REDIR_PROTOCOLS_STR, "https");
     return CURL_PREREQFUNC_OK;
+}
 }
 
 } // namespace

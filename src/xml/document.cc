@@ -6,7 +6,7 @@ namespace {
 
 // Replies are small and define no entities. Beyond this much expansion expat compares it with what
 // was sent, so that a few bytes cannot unfold into gigabytes.
-constexpr unsigned long long unguarded_expansion = 64 * 1024;
+constexpr unsigned long long unguarded_expansion = 65536; // 64 KiB
 
 } // namespace
 
