@@ -800,6 +800,162 @@ QM_API const char *file_links_get_error(const file_links *record);
 QM_API void file_links_delete(file_links **record);
 
 /* -------------------------------------------------------------------------------------------------
+ * Lists of records
+ *
+ * A list is known by its first node, which holds no record: walk it from list->next. New records go
+ * to the front, so what was added last, and stood last in a reply, comes first. A list owns its
+ * nodes and their records. For each kind
+ *
+ *   <kind>_list_new        makes an empty list;
+ *   add_to_<kind>_list     hands a record over to a list; does nothing if either is NULL;
+ *   delete_all_<kind>_list deletes *list with all its records, and deliberately leaves the pointer
+ * as it was. NULL, or a pointer to NULL, does nothing.
+ * ---------------------------------------------------------------------------------------------- */
+
+/** A node of a list of files. */
+typedef struct file_list {
+    file_info *record;      /**< Owned; NULL in the first node. */
+    struct file_list *next; /**< NULL at the end. */
+} file_list;
+
+QM_API file_list *file_info_list_new(void);
+QM_API void add_to_file_list(file_list *list, file_info *record);
+QM_API void delete_all_file_list(file_list **list);
+
+/** A node of a list of folders. */
+typedef struct folder_list {
+    folder_info *record;      /**< Owned; NULL in the first node. */
+    struct folder_list *next; /**< NULL at the end. */
+} folder_list;
+
+QM_API folder_list *folder_info_list_new(void);
+QM_API void add_to_folder_list(folder_list *list, folder_info *record);
+QM_API void delete_all_folder_list(folder_list **list);
+
+/** A node of a list of changes. */
+typedef struct change_list {
+    change_info *record;      /**< Owned; NULL in the first node. */
+    struct change_list *next; /**< NULL at the end. */
+} change_list;
+
+QM_API change_list *change_list_new(void);
+QM_API void add_to_change_list(change_list *list, change_info *record);
+QM_API void delete_all_change_list(change_list **list);
+
+/** A node of a list of the links of several files. */
+typedef struct file_links_list {
+    file_links *record;           /**< Owned; NULL in the first node. */
+    struct file_links_list *next; /**< NULL at the end. */
+} file_links_list;
+
+QM_API file_links_list *file_links_list_new(void);
+QM_API void add_to_file_links_list(file_links_list *list, file_links *record);
+QM_API void delete_all_file_links_list(file_links_list **list);
+
+/* -------------------------------------------------------------------------------------------------
+ * Pairs of texts. The library hands out none; the type is there for applications.
+ * ---------------------------------------------------------------------------------------------- */
+
+/** A pair, and the list of those added after it. */
+typedef struct key_value {
+    char *key;              /**< Owned, or NULL. */
+    char *value;            /**< Owned, or NULL. */
+    struct key_value *next; /**< The pair added next, or NULL. */
+} key_value;
+
+/** Makes a list of one pair, with copies of the texts, either of which may be NULL. */
+QM_API key_value *key_value_new(const char *key, const char *value);
+
+/** Adds a pair at the end of the list and returns its node; NULL if the list is NULL. Walks the
+ * whole list. */
+QM_API key_value *key_value_add(key_value *list, const char *key, const char *value);
+
+/** The node that follows, or NULL at the end or for NULL. */
+QM_API key_value *key_value_get_next_pair(const key_value *pair);
+
+/** The texts of a pair, borrowed. Deliberately, and unlike the getters of records, these do not
+ * take NULL. */
+QM_API const char *key_value_get_key(const key_value *pair);
+QM_API const char *key_value_get_value(const key_value *pair);
+
+/** Frees a list from the given node on. NULL does nothing. */
+QM_API void key_value_delete(key_value *list);
+
+/* -------------------------------------------------------------------------------------------------
+ * Reading lists from replies. The operations use these.
+ *
+ * Each takes a reply and its length, of which only the low 32 bits count, and lists of the
+ * caller's, and makes one record for each entry, in the reply's order. An entry's texts are those
+ * of the elements right inside it; an element that occurs twice has its texts joined. They return 1
+ * if the reply is not well-formed, else 0; the records finished before the damage stay in the lists
+ * and are counted. A reply that is NULL or of length 0 returns 0 and touches nothing. Any thread.
+ *
+ * The callbacks below are expat's, for a start tag, an end tag and text, and take the state of
+ * their extractor.
+ * ---------------------------------------------------------------------------------------------- */
+
+/** State of simple_extract_folders_content(). */
+typedef struct folder_content_state {
+    file_info *current_file;     /**< File being read, or NULL. */
+    folder_info *current_folder; /**< Folder being read, or NULL. */
+    file_list *files;            /**< The caller's. */
+    folder_list *folders;        /**< The caller's. */
+    int32_t mode;                /**< 0 outside an entry, 1 in a folder, 2 in a file. */
+    char *current_element;       /**< Name of the element whose text comes next, owned, or NULL. */
+    int32_t file_count;          /**< Files added to the list. */
+    int32_t folder_count;        /**< Folders added to the list. */
+} folder_content_state;
+
+/** Reads the elements "folder" and "file", at any depth. */
+QM_API uint32_t simple_extract_folders_content(const char *xml, uint64_t length,
+                                               folder_list *folders, int32_t *folder_count,
+                                               file_list *files, int32_t *file_count);
+QM_API void simple_extract_folders_node_value_start(void *state, const char *element,
+                                                    const char **attributes);
+QM_API void simple_extract_folders_node_value_end(void *state, const char *element);
+QM_API void simple_extract_folders_node_value_data(void *state, const char *text, int32_t length);
+
+/** State of simple_extract_changes(). */
+typedef struct changes_state {
+    void *parser;                /**< The expat parser (XML_Parser), which a callback may stop. */
+    change_info *current_change; /**< Change being read. */
+    change_list *changes;        /**< The caller's. */
+    char *current_element;       /**< Name of the element whose text comes next, owned, or NULL. */
+    int32_t change_count;        /**< Changes added to the list. */
+    int32_t change_type;         /**< 1 after "updated", 0 after "deleted" and at the start. */
+    int32_t object_kind;         /**< 1 after "folders", 0 after "files" and at the start. */
+    int32_t in_object;           /**< 1 while a change is being read. */
+} changes_state;
+
+/**
+ * Reads the elements "file" and "folder" below "updated" and "deleted", "files" and "folders". One
+ * inside another stops the reading, is logged, and counts as damage.
+ */
+QM_API uint32_t simple_extract_changes(const char *xml, uint64_t length, change_list *changes,
+                                       uint32_t *change_count);
+QM_API void simple_extract_changes_node_value_start(void *state, const char *element,
+                                                    const char **attributes);
+QM_API void simple_extract_changes_node_value_end(void *state, const char *element);
+QM_API void simple_extract_changes_node_value_data(void *state, const char *text, int32_t length);
+
+/** State of simple_extract_file_links(). */
+typedef struct links_state {
+    file_links *current_link; /**< Link record being read, or NULL. */
+    file_links_list *links;   /**< The caller's. */
+    int32_t in_link;          /**< 1 while a link record is being read. */
+    char *current_element;    /**< Name of the element whose text comes next, owned, or NULL. */
+    int32_t link_count;       /**< Link records added to the list. */
+} links_state;
+
+/** Reads the elements "link". */
+QM_API uint32_t simple_extract_file_links(const char *xml, uint64_t length, file_links_list *links,
+                                          int32_t *link_count);
+QM_API void simple_extract_links_node_value_start(void *state, const char *element,
+                                                  const char **attributes);
+QM_API void simple_extract_links_node_value_end(void *state, const char *element);
+QM_API void simple_extract_links_node_value_data(void *state, const char *text, int32_t length);
+
+/* -------------------------------------------------------------------------------------------------
  * Operations
  *
  * Each performs one exchange on urls[1], blocks until it is over, and may be called on any thread
@@ -911,6 +1067,295 @@ QM_API int32_t get_system_status(system_status **status, char **error_message);
 QM_API int32_t get_device_status(const char *session_token, uint32_t device_id,
                                  uint64_t *device_revision, int32_t *async_jobs_in_progress,
                                  char **error_message);
+
+/** The account. */
+extern QM_API const char *get_user_info_uri;    /**< "/api/user/get_info.php" */
+extern QM_API const char *get_user_limits_uri;  /**< "/api/user/get_limits.php" */
+extern QM_API const char *myfiles_revision_uri; /**< "/api/user/myfiles_revision.php" */
+
+/**
+ * Reads the account's profile, its storage figures and its linked social accounts.
+ *
+ * @param session_token the session
+ * @param info          receives the record or NULL; the caller deletes it
+ */
+QM_API int32_t get_user_info(const char *session_token, user_info **info, char **error_message);
+
+/**
+ * Reads the account's quotas and their use.
+ *
+ * @param session_token the session
+ * @param limits        receives the record or NULL; the caller deletes it
+ */
+QM_API int32_t get_user_limits(const char *session_token, user_limits **limits,
+                               char **error_message);
+
+/**
+ * Reads the revision and epoch of the account's file tree.
+ *
+ * @param session_token the session
+ * @param revision      receives the revision as text, or NULL; the caller frees it
+ * @param epoch         receives the epoch as text, or NULL; the caller frees it
+ * @return a status; QM_OK needs only one of the two, and QM_UNUSABLE_RESPONSE means that neither
+ * came. A negative response code counts as QM_UNUSABLE_RESPONSE here
+ *
+ * Deliberately, nothing is logged, and transport failures have no message.
+ */
+QM_API int32_t get_myfiles_revision(const char *session_token, char **revision, char **epoch,
+                                    char **error_message);
+
+/** Folders. */
+extern QM_API const char *get_folder_info_uri;    /**< "/api/folder/get_info.php" */
+extern QM_API const char *create_folder_uri;      /**< "/api/folder/create.php" */
+extern QM_API const char *delete_folder_uri;      /**< "/api/folder/delete.php" */
+extern QM_API const char *update_folder_uri;      /**< "/api/folder/update.php" */
+extern QM_API const char *copy_folder_uri;        /**< "/api/folder/copy.php" */
+extern QM_API const char *move_folder_uri;        /**< "/api/folder/move.php" */
+extern QM_API const char *get_folder_content_uri; /**< "/api/1.0/folder/get_content.php" */
+extern QM_API const char *attach_foreign_uri;     /**< "/api/folder/attach_foreign.php" */
+extern QM_API const char *detach_foreign_uri;     /**< "/api/folder/detach_foreign.php" */
+
+/**
+ * Reads what the service knows of a folder.
+ *
+ * @param session_token the session, or NULL; sent as it is
+ * @param folder_key    the folder, or NULL; sent as it is
+ * @param device_id     a device id, or NULL; sent as it is
+ * @param details       the kind of details, sent as it is; NULL or "" asks for "yes"
+ * @param error_message deliberately ahead of the result
+ * @param info          receives the record or NULL; the caller deletes it
+ * @return a status, QM_NO_ERROR_ELEMENT among them
+ */
+QM_API int32_t get_folder_info(const char *session_token, const char *folder_key,
+                               const char *device_id, const char *details, char **error_message,
+                               folder_info **info);
+
+/**
+ * Creates a folder, unless its name is taken there.
+ *
+ * @param session_token the session
+ * @param name          name of the folder
+ * @param parent_key    folder to create it in; NULL or "" for the account's root
+ * @param mtime         modification time; NULL or "" for none
+ * @param folder_key    receives the new folder's key, or NULL if the call failed or the reply named
+ * none; the caller frees it
+ */
+QM_API int32_t create_folder(const char *session_token, const char *name, const char *parent_key,
+                             const char *mtime, char **folder_key, char **error_message);
+
+/** Deletes a folder and all that it holds. */
+QM_API int32_t delete_folder(const char *session_token, const char *folder_key,
+                             char **error_message);
+
+/**
+ * Changes a folder's metadata.
+ *
+ * @param session_token     the session
+ * @param folder_key        the folder
+ * @param name              new name; NULL or "" leaves it
+ * @param description       new description; NULL leaves it, "" clears it
+ * @param tags              new tags; NULL leaves them, "" clears them
+ * @param privacy           -1 public, 1 private; any other value leaves it
+ * @param privacy_recursive with a new privacy: non-zero applies it to all that the folder holds
+ * @param mtime             modification time; NULL or "" leaves it
+ */
+QM_API int32_t update_folder(const char *session_token, const char *folder_key, const char *name,
+                             const char *description, const char *tags, int32_t privacy,
+                             int32_t privacy_recursive, const char *mtime, char **error_message);
+
+/**
+ * Copies a folder and everything in it into another folder.
+ *
+ * @param session_token   the session
+ * @param source_key      the folder to copy, sent as it is
+ * @param destination_key the receiving folder, sent as it is, or NULL to leave it out of the
+ * request
+ * @param new_folder_key  receives the key of the copy, or NULL if the call failed or the reply
+ * named none; the caller frees it
+ * @return a status, QM_NO_ERROR_ELEMENT among them
+ */
+QM_API int32_t copy_folder(const char *session_token, const char *source_key,
+                           const char *destination_key, char **new_folder_key,
+                           char **error_message);
+
+/**
+ * Moves a folder and everything in it into another folder.
+ *
+ * @param session_token   the session
+ * @param source_key      the folder to move, sent as it is
+ * @param destination_key the receiving folder, sent as it is, or NULL to leave it out of the
+ * request
+ * @return a status, QM_NO_ERROR_ELEMENT among them
+ */
+QM_API int32_t move_folder(const char *session_token, const char *source_key,
+                           const char *destination_key, char **error_message);
+
+/**
+ * Reads one chunk of a folder's listing. All texts are sent as they are; each may be NULL, which
+ * leaves it out, while
+ * "" is sent.
+ *
+ * @param session_token the session
+ * @param folder_key    the folder
+ * @param device_id     a device id
+ * @param chunk         number of the chunk, as text
+ * @param content_type  the kind of entries asked for
+ * @param error_message deliberately ahead of the results
+ * @param folders       receives the chunk's folders, or NULL if there are none; the caller deletes
+ * the list
+ * @param folder_count  receives their number
+ * @param files         receives the chunk's files, or NULL if there are none; the caller deletes
+ * the list
+ * @param file_count    receives their number
+ * @param chunk_size    receives the most entries that a chunk holds, 100 if the reply does not say
+ * @return a status, QM_NO_ERROR_ELEMENT among them. With QM_MALFORMED_REPLY both lists are NULL,
+ * but the numbers may have been set
+ */
+QM_API int32_t get_folder_content(const char *session_token, const char *folder_key,
+                                  const char *device_id, const char *chunk,
+                                  const char *content_type, char **error_message,
+                                  folder_list **folders, int32_t *folder_count, file_list **files,
+                                  int32_t *file_count, int32_t *chunk_size);
+
+/**
+ * Attaches another account's folder to this account, or detaches it again. Both texts are sent as
+ * they are.
+ *
+ * @param session_token the session
+ * @param folder_key    the foreign folder
+ * @return a status, QM_NO_ERROR_ELEMENT among them
+ */
+QM_API int32_t attach_foreign_folder(const char *session_token, const char *folder_key,
+                                     char **error_message);
+QM_API int32_t detach_foreign_folder(const char *session_token, const char *folder_key,
+                                     char **error_message);
+
+/** Files. */
+extern QM_API const char *get_file_info_uri; /**< "/api/file/get_info.php" */
+extern QM_API const char *create_file_uri;   /**< "/api/file/create.php" */
+extern QM_API const char *delete_file_uri;   /**< "/api/file/delete.php" */
+extern QM_API const char *copy_file_uri;     /**< "/api/file/copy.php" */
+extern QM_API const char *move_file_uri;     /**< "/api/file/move.php" */
+
+/**
+ * Reads what the service knows of a file.
+ *
+ * @param quick_key     the file, deliberately ahead of the session; sent as it is
+ * @param session_token the session, or NULL
+ * @param error_message deliberately ahead of the result
+ * @param info          receives the record or NULL; the caller deletes it
+ */
+QM_API int32_t get_file_info(const char *quick_key, const char *session_token, char **error_message,
+                             file_info **info);
+
+/**
+ * Creates an empty file.
+ *
+ * @param session_token  the session
+ * @param filename       name, or NULL
+ * @param file_extension extension, or NULL
+ * @param parent_key     folder to create it in, or NULL
+ * @param mtime          modification time; NULL or "" for none
+ * @param quick_key      receives the new file's key, or NULL if the call failed or the reply named
+ * none; the caller frees it
+ */
+QM_API int32_t create_file(const char *session_token, const char *filename,
+                           const char *file_extension, const char *parent_key, const char *mtime,
+                           char **quick_key, char **error_message);
+
+/** Deletes a file. The quick key is sent as it is. */
+QM_API int32_t delete_file(const char *session_token, const char *quick_key, char **error_message);
+
+/**
+ * Copies a file into another folder.
+ *
+ * @param session_token the session
+ * @param quick_key     the file, sent as it is
+ * @param folder_key    the receiving folder, or NULL to leave it out of the request
+ * @param new_quick_key receives the key of the copy, or NULL if the call failed or the reply named
+ * none; the caller frees it
+ */
+QM_API int32_t copy_file(const char *session_token, const char *quick_key, const char *folder_key,
+                         char **new_quick_key, char **error_message);
+
+/**
+ * Moves a file into another folder.
+ *
+ * @param session_token the session
+ * @param quick_key     the file, sent as it is
+ * @param folder_key    the receiving folder, or NULL to leave it out of the request
+ */
+QM_API int32_t move_file(const char *session_token, const char *quick_key, const char *folder_key,
+                         char **error_message);
+
+/** Links of files. Both operations ask the same endpoint. */
+extern QM_API const char *get_links_uri;         /**< "/api/file/get_links.php" */
+extern QM_API const char *get_download_link_uri; /**< "/api/file/get_links.php" */
+
+/**
+ * Reads the links of a file.
+ *
+ * @param quick_key     the file, or several with commas between; deliberately percent-encoded here
+ * @param link_type     the kind of link; NULL or "" for all
+ * @param session_token the session; NULL or "" for none
+ * @param links         receives the links, or NULL if there are none; the caller deletes the list
+ * @param link_count    receives their number, which stays set with QM_MALFORMED_REPLY
+ */
+QM_API int32_t get_links(const char *quick_key, const char *link_type, const char *session_token,
+                         file_links_list **links, int32_t *link_count, char **error_message);
+
+/**
+ * Reads the link under which a file's bytes can be fetched.
+ *
+ * @param session_token          the session
+ * @param quick_key              the file, sent as it is
+ * @param download_url           receives the link, or NULL if there is none; a link without a
+ * scheme is given "http". The caller frees it
+ * @param free_bandwidth         receives the bandwidth that is left for free downloads, or 0
+ * @param error_message          deliberately between the two pairs of results
+ * @param download_error         receives the number of a refusal of the download, or 0
+ * @param download_error_message receives that refusal's message or NULL; the caller frees it
+ * @return a status; QM_OK says nothing of the link: see download_url and download_error. With
+ * QM_MALFORMED_REPLY the two texts are NULL, but the numbers may have been set
+ */
+QM_API int32_t get_download_link(const char *session_token, const char *quick_key,
+                                 char **download_url, int32_t *free_bandwidth, char **error_message,
+                                 int32_t *download_error, char **download_error_message);
+
+/** The device change feed. */
+extern QM_API const char *get_device_changes_uri; /**< "/api/device/get_changes.php" */
+
+/**
+ * Reads everything that changed in the account after a revision.
+ *
+ * @param session_token   the session
+ * @param revision        the revision up to which the caller is up to date
+ * @param device_id       id of the device
+ * @param device_revision receives the account's revision now, or 0
+ * @param changes         receives the list of changes, which may be empty, or NULL; the caller
+ * deletes it. With QM_MALFORMED_REPLY, deliberately, it may point to a list that has been deleted
+ * already: do not touch it
+ * @param change_count    receives the number of changes
+ * @param block_size      receives the number of revisions of which the service hands out changes at
+ * once, or 0
+ *
+ * With QM_MALFORMED_REPLY the numbers may have been set.
+ */
+QM_API int32_t get_device_changes(const char *session_token, uint64_t revision, uint32_t device_id,
+                                  uint64_t *device_revision, change_list **changes,
+                                  uint32_t *change_count, int32_t *block_size,
+                                  char **error_message);
+
+/**
+ * Does as get_device_changes() does, but reads a reply that is built into the library instead of
+ * asking the service: a feed of 17 changes up to revision 59. The block size stays 0, deliberately.
+ *
+ * @return QM_OK
+ */
+QM_API int32_t test_get_device_changes(const char *session_token, uint64_t revision,
+                                       uint32_t device_id, uint64_t *device_revision,
+                                       change_list **changes, uint32_t *change_count,
+                                       int32_t *block_size, char **error_message);
 
 #ifdef __cplusplus
 }

@@ -3,6 +3,8 @@
 #include <cstdio>
 #include <cstring>
 
+#include "text/number.h"
+
 namespace quillmere {
 
 api_call::api_call(const char *path, char **error_message)
@@ -12,6 +14,8 @@ api_call::api_call(const char *path, char **error_message)
     string_append(url_.get(), urls[1]);
     string_append(url_.get(), path);
 }
+
+void api_call::text(const char *text) { string_append(url_.get(), text); }
 
 void api_call::plain(const char *key, const char *value)
 {
@@ -41,14 +45,26 @@ void api_call::version() { plain("&version=", api_version); }
 
 void api_call::fetch(const char *url_heading, reply_log log)
 {
-    if (url_heading)
-        qm_printf("%s%s\n", url_heading, string_get_obfs(url_.get(), nullptr));
-
+    log_url(url_heading);
     char *reply = nullptr;
     response_code_ =
         get_response_from_url(string_get(url_.get()), nullptr, 0, &reply, &reply_length_, 0);
     reply_.reset(reply);
     log_reply(log);
+}
+
+void api_call::pretend(const char *url_heading, const char *reply, uint64_t length)
+{
+    log_url(url_heading);
+    reply_.reset(string_dup(reply));
+    reply_length_ = length;
+    log_reply(reply_log::text);
+}
+
+void api_call::log_url(const char *heading)
+{
+    if (heading)
+        qm_printf("%s%s\n", heading, string_get_obfs(url_.get(), nullptr));
 }
 
 void api_call::log_reply(reply_log log) const
@@ -89,15 +105,25 @@ heap_text api_call::required_text_of(const char *element)
 {
     heap_text text = text_of(element);
     if (!text)
-        status_ = QM_UNUSABLE_RESPONSE;
+        reply_is_unusable();
     return text;
 }
 
-void api_call::refused(error_reading)
+void api_call::refused(error_reading reading)
 {
-    get_error_from_xml(reply_.get(), reply_length_, &status_, error_message_);
+    if (reading == error_reading::direct)
+        read_error_directly();
+    else
+        get_error_from_xml(reply_.get(), reply_length_, &status_, error_message_);
     if (check_api_error)
         check_api_error(string_get(url_.get()), reply_.get(), status_, *error_message_);
+}
+
+void api_call::read_error_directly()
+{
+    heap_text number = text_of("error");
+    status_ = number ? error_number_in(number.get()) : QM_NO_ERROR_ELEMENT;
+    *error_message_ = text_of("message").release();
 }
 
 void api_call::failed_exchange(exchange_verdict verdict)

@@ -3,7 +3,10 @@
 // arguments with names, or plain statements.
 #pragma once
 
+#include <cstdlib>
+
 #include "owned.h"
+#include "records/elements.h"
 #include "records/records.h"
 
 namespace quillmere {
@@ -28,18 +31,15 @@ enum class exchange_verdict {
 // How the error number and message of a refusal are read.
 enum class error_reading {
     standard, // get_error_from_xml()
-};
-
-// Ties an element of the reply, a name or a path below the root, to a field.
-template <class Record> struct element_field {
-    const char *element;
-    char *Record::*field;
+    direct    // by the names of the elements, and a missing number is -1
 };
 
 class api_call {
 public:
     // Starts the URL with the TLS base and the path, and resets the error message.
     api_call(const char *path, char **error_message);
+
+    void text(const char *text);
 
     // Each appends a key, with its punctuation, and a value.
     void plain(const char *key, const char *value);
@@ -51,7 +51,12 @@ public:
     // Logs the URL behind a heading (null: not at all), performs the exchange and logs the reply.
     void fetch(const char *url_heading, reply_log log);
 
+    // As fetch(), but with a reply that is given instead of an exchange.
+    void pretend(const char *url_heading, const char *reply, uint64_t length);
+
     bool has_reply() const { return reply_ != nullptr; }
+    const char *reply() const { return reply_.get(); }
+    uint64_t reply_length() const { return reply_length_; }
 
     // Whether the result is "Success". If not, status and error message say why, and the error hook
     // has been called for a refusal.
@@ -61,8 +66,14 @@ public:
     // The text of an element, or null.
     heap_text text_of(const char *element);
 
-    // As the token that the service must hand out: without it, the reply is of no use.
+    // The same for what the service must hand out: without it, the reply is of no use.
     heap_text required_text_of(const char *element);
+
+    // A "Success" that lacks what was asked for.
+    void reply_is_unusable() { status_ = QM_UNUSABLE_RESPONSE; }
+
+    // Counts what an extractor reports, 1 if it could not parse the reply.
+    void extracted(uint32_t parse_failed) { parse_failures_ += parse_failed; }
 
     // Looks up the elements of a table, in its order, into a record's fields.
     template <class Record, size_t count>
@@ -88,8 +99,10 @@ public:
     int32_t status() const { return malformed() ? QM_MALFORMED_REPLY : status_; }
 
 private:
+    void log_url(const char *heading);
     void log_reply(reply_log log) const;
     void refused(error_reading reading);
+    void read_error_directly();
     void failed_exchange(exchange_verdict verdict);
     void explain_failed_exchange();
 
@@ -101,5 +114,18 @@ private:
     uint32_t parse_failures_ = 0;
     int32_t status_ = -1;
 };
+
+// Frees a text that was handed out too early, and takes it back.
+inline void discard(char **text)
+{
+    std::free(*text);
+    *text = nullptr;
+}
+
+// A flag as the service writes it: nothing but this very text sets it.
+inline bool is_yes(const char *text) { return text && std::strcmp(text, "yes") == 0; }
+
+// Whether an optional text says anything.
+inline bool given(const char *text) { return text && *text; }
 
 } // namespace quillmere

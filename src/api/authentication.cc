@@ -14,8 +14,6 @@ const char *renew_session_token_uri = "/api/user/renew_session_token.php";
 
 namespace {
 
-bool given(const char *text) { return text && *text; }
-
 // SHA-1 of the pieces, joined without separators. The pieces enter unencoded, whatever the URL
 // makes of them.
 class request_signature {

@@ -1,6 +1,4 @@
 // The state of the service and of the caller's device.
-#include <cstring>
-
 #include "api/api_call.h"
 #include "text/number.h"
 
@@ -68,8 +66,7 @@ int32_t get_device_status(const char *session_token, uint32_t device_id, uint64_
     if (call.accepted()) {
         if (heap_text revision = call.text_of("device_revision"))
             *device_revision = uint64_in(revision.get());
-        heap_text jobs = call.text_of("async_jobs_in_progress");
-        if (jobs && std::strcmp(jobs.get(), "yes") == 0)
+        if (is_yes(call.text_of("async_jobs_in_progress").get()))
             *async_jobs_in_progress = 1;
     }
     return call.status();

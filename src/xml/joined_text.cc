@@ -9,6 +9,8 @@ namespace quillmere {
 
 void joined_text::append(char **value, const char *piece, int length)
 {
+    if (!*value)
+        length_ = capacity_ = 0;
     auto count = static_cast<uint64_t>(length);
     uint64_t needed = length_ + count + 1;
     if (needed > capacity_) {

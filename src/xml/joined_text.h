@@ -8,8 +8,8 @@ namespace quillmere {
 
 class joined_text {
 public:
-    // Appends to the value, which must be NULL at first and touched by nobody else between the
-    // appends. It is malloc memory, NUL-terminated after every append.
+    // Appends to the value. A NULL one starts a new text; any other must be what the last append
+    // left, touched by nobody else. It is malloc memory, NUL-terminated after every append.
     void append(char **value, const char *piece, int length);
 
 private:
