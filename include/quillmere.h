@@ -487,6 +487,78 @@ QM_API int32_t check_url_response(const char *base_url, const char *query,
 QM_API char *normalize_url(const char *url, const char *scheme);
 
 /* -------------------------------------------------------------------------------------------------
+ * Streaming upload
+ *
+ * A raw connection to the upload server. The application writes its own HTTP request over it, to a
+ * URL from get_upload_url() or get_patch_upload_url(), and reads the raw reply, which
+ * parse_upload_response() interprets.
+ *
+ *   - One call moves at most one chunk: call again until everything is sent.
+ *   - A connection may idle for 60 seconds; after that reads and writes fail until it is deleted.
+ *   - With TLS the port is always 443, whatever the URL says, and use_tls must agree with the URL's
+ * scheme.
+ *   - With TLS a read buffer should hold a whole TLS record, 16 KiB (RFC 8446): readiness is asked
+ * of the socket, which knows nothing of bytes that the TLS library has taken in already.
+ *   - The proxy and ssl_disabled are not applied, deliberately.
+ *   - Messages go to standard output, not to the diagnostic log.
+ * ---------------------------------------------------------------------------------------------- */
+
+/** A connection. Owned by the application, released with send_file_delete(). */
+typedef struct send_file {
+    void *handle;    /**< The libcurl easy handle (CURL *), connected. */
+    int64_t timeout; /**< Seconds, exactly as given to send_file_new(); for the application. */
+    int32_t socket;  /**< The socket's descriptor. */
+    int64_t last_transmission; /**< Seconds since the epoch when the last byte moved. */
+} send_file;
+
+/**
+ * Connects to the host of a URL.
+ *
+ * @param connection receives the connection, or NULL
+ * @param url        where to connect to
+ * @param use_tls    non-zero for TLS on port 443, verified against ca_cert_pem_path.path; without a
+ * path the peer's certificate is not verified
+ * @param timeout    seconds for connecting; below 1 means 60
+ * @return 0; -1 if connecting failed; -2 if the socket is unknown; -200 if libcurl made no handle.
+ * Blocks. Any thread.
+ */
+QM_API int32_t send_file_new(send_file **connection, const char *url, int32_t use_tls,
+                             int64_t timeout);
+
+/**
+ * Sends some of the bytes given, waiting for room.
+ *
+ * @param size their number; of 0 bytes none are sent and the time of the last transmission stays
+ * @return the number sent, which may be smaller; -5 if nothing could be sent for 60 seconds; -6 if
+ * sending failed
+ */
+QM_API int32_t send_file_write(send_file *connection, const void *data, uint64_t size);
+
+/**
+ * Receives some bytes, waiting for them.
+ *
+ * @param size room in the buffer
+ * @return the number received; 0 if the peer has closed the connection; -5 if nothing came for 60
+ * seconds; -7 if receiving failed
+ */
+QM_API int32_t send_file_read(send_file *connection, void *buffer, uint64_t size);
+
+/** Closes and frees *connection, and sets the pointer to NULL. NULL, or a pointer to NULL, does
+ * nothing. */
+QM_API void send_file_delete(send_file **connection);
+
+/** Seconds since a byte last moved, or 0 if the clock cannot be read. */
+QM_API uint64_t send_file_seconds_since_last_transmission(const send_file *connection);
+
+/**
+ * Makes this moment the time of the last transmission.
+ *
+ * @return seconds since the epoch, or -1 if the clock cannot be read, in which case nothing is
+ * changed
+ */
+QM_API int64_t send_file_update_connection_last_timestamp(send_file *connection);
+
+/* -------------------------------------------------------------------------------------------------
  * Reading replies
  * ---------------------------------------------------------------------------------------------- */
 
@@ -549,6 +621,88 @@ QM_API void node_value_data_accumulate(char **value, const char *text, int32_t l
  */
 QM_API void get_error_from_xml(const char *xml, uint64_t length, int32_t *error_code,
                                char **error_message);
+
+/* -------------------------------------------------------------------------------------------------
+ * Request objects: one call of the service's interface, put together by hand.
+ * ---------------------------------------------------------------------------------------------- */
+
+/** A request. Its four pointers are owned by it. Callers write url, post_data, timeout and verbose.
+ */
+typedef struct api_request {
+    string_buffer *url;       /**< The whole URL, from api_url_new_https() or api_url_new_http(). */
+    string_buffer *post_data; /**< Body to POST, or NULL for a GET. */
+    char *response;           /**< Body of the response after the call, or NULL. */
+    uint64_t response_length; /**< Its length in bytes. */
+    int64_t timeout;          /**< Seconds; below 1, as at first, means the default time-out. */
+    int32_t verbose; /**< Non-zero, as at first: the call logs the redacted URL and the response. */
+} api_request;
+
+/**
+ * Starts a request's URL: the base address of urls[1] or urls[0], the path and "?".
+ *
+ * @return a string buffer, the caller's until a request takes it
+ */
+QM_API string_buffer *api_url_new_https(const char *path);
+QM_API string_buffer *api_url_new_http(const char *path);
+
+/**
+ * Adds a parameter to a URL: "&", the key as it is, "=", and the value, percent-encoded if it is
+ * text. Deliberately, "&" comes before the first parameter too. The value of a sensitive one is
+ * left out when the URL is logged.
+ *
+ *   required                adds always; a NULL value leaves the key with nothing behind the "="
+ *   optional, null          skips NULL
+ *   optional, null_or_empty skips NULL and ""
+ *   optional, num, negative skips numbers below 0
+ *   optional, num, zero     skips 0 and numbers below
+ *
+ * Numbers are written unsigned, so that a required -1 becomes 18446744073709551615. The three
+ * functions with a trailing underscore do the same as the required ones.
+ *
+ * @return the URL's length, or -1 if a required value is NULL
+ */
+QM_API int64_t url_add_required_parameter(string_buffer *url, const char *key, const char *value);
+QM_API int64_t url_add_required_sensitive_parameter(string_buffer *url, const char *key,
+                                                    const char *value);
+QM_API int64_t url_add_required_num_parameter(string_buffer *url, const char *key, int64_t value);
+QM_API int64_t url_add_optional_parameter_null(string_buffer *url, const char *key,
+                                               const char *value);
+QM_API int64_t url_add_optional_parameter_null_or_empty(string_buffer *url, const char *key,
+                                                        const char *value);
+QM_API int64_t url_add_optional_sensitive_parameter_null(string_buffer *url, const char *key,
+                                                         const char *value);
+QM_API int64_t url_add_optional_sensitive_parameter_null_or_empty(string_buffer *url,
+                                                                  const char *key,
+                                                                  const char *value);
+QM_API int64_t url_add_optional_num_parameter_negative(string_buffer *url, const char *key,
+                                                       int64_t value);
+QM_API int64_t url_add_optional_num_parameter_zero(string_buffer *url, const char *key,
+                                                   int64_t value);
+QM_API int64_t url_add_string_parameter_(string_buffer *url, const char *key, const char *value);
+QM_API int64_t url_add_sensitive_string_parameter_(string_buffer *url, const char *key,
+                                                   const char *value);
+QM_API int64_t url_add_num_parameter_(string_buffer *url, const char *key, int64_t value);
+
+/** Makes an empty request, released with api_request_delete(). */
+QM_API api_request *api_request_new(void);
+
+/**
+ * Performs a request and judges the reply.
+ *
+ * @param request the request, which then holds the response
+ * @param message receives the message of a failure, the caller's to free; left as it was otherwise,
+ * so set it to NULL beforehand. Must not be NULL
+ * @return QM_OK, the service's own error number, QM_NO_RESPONSE, QM_UNUSABLE_RESPONSE,
+ * QM_UNUSABLE_ERROR_NUMBER or QM_MALFORMED_REPLY, which overrides the others. The error hook is
+ * called with refusals alone.
+ *
+ * Blocks. Any thread, each with a request of its own.
+ */
+QM_API int32_t make_api_call(api_request *request, char **message);
+
+/** Frees *request and all that it holds, and leaves the pointer as it was. NULL, or a pointer to
+ * NULL, does nothing. */
+QM_API void api_request_delete(api_request **request);
 
 /* -------------------------------------------------------------------------------------------------
  * Records
@@ -1356,6 +1510,63 @@ QM_API int32_t test_get_device_changes(const char *session_token, uint64_t revis
                                        uint32_t device_id, uint64_t *device_revision,
                                        change_list **changes, uint32_t *change_count,
                                        int32_t *block_size, char **error_message);
+
+/** Uploads. */
+extern QM_API const char *update_file_uri; /**< "/api/file/update.php" */
+
+/**
+ * Makes the URL to which a new file is uploaded. Nothing is encoded.
+ *
+ * @param session_token the session
+ * @param upload_key    key of an upload to go on with, or NULL
+ * @param use_tls       non-zero for urls[3], else urls[2]
+ * @return the URL, the caller's to free; NULL if session_token is NULL. Any thread.
+ */
+QM_API char *get_upload_url(const char *session_token, const char *upload_key, int32_t use_tls);
+
+/**
+ * Makes the URL to which a new revision of a file is uploaded. Nothing is encoded.
+ *
+ * @param session_token the session
+ * @param quick_key     the file
+ * @param revision      the revision that the change is based on
+ * @param target_hash   digest of the new revision, in hexadecimal
+ * @param target_size   its size in bytes
+ * @param use_tls       non-zero for urls[3], else urls[2]
+ * @return the URL, the caller's to free; NULL if session_token is NULL. Any thread.
+ */
+QM_API char *get_patch_upload_url(const char *session_token, const char *quick_key,
+                                  uint64_t revision, const char *target_hash, uint64_t target_size,
+                                  int32_t use_tls);
+
+/**
+ * Reads the upload server's raw reply, HTTP headers and all.
+ *
+ * @param reply      the bytes that were received
+ * @param length     their number
+ * @param upload_key receives the upload's key or NULL, also for a refused upload; the caller frees
+ * it
+ * @return 0 if the upload was accepted; -1 if not, or if the reply is shorter than 4 bytes;
+ * QM_MALFORMED_REPLY. Any thread.
+ */
+QM_API int32_t parse_upload_response(const char *reply, uint64_t length, char **upload_key);
+
+/**
+ * Changes a file's metadata. Deliberately, the request goes to urls[0], the plain base address.
+ *
+ * @param session_token the session
+ * @param quick_key     the file
+ * @param filename      new name; NULL or "" leaves it
+ * @param description   new description; NULL leaves it, "" clears it
+ * @param tags          new tags; NULL leaves them, "" clears them
+ * @param privacy       new privacy; NULL or "" leaves it
+ * @param mtime         modification time; NULL or "" leaves it
+ * @param message       receives the message of a failure or NULL; the caller frees it
+ * @return as make_api_call()
+ */
+QM_API int32_t update_file(const char *session_token, const char *quick_key, const char *filename,
+                           const char *description, const char *tags, const char *privacy,
+                           const char *mtime, char **message);
 
 #ifdef __cplusplus
 }

@@ -1,9 +1,9 @@
 #include "api/api_call.h"
 
-#include <cstdio>
 #include <cstring>
 
 #include "text/number.h"
+#include "transport/failed_exchange.h"
 
 namespace quillmere {
 
@@ -128,25 +128,11 @@ void api_call::read_error_directly()
 
 void api_call::failed_exchange(exchange_verdict verdict)
 {
-    bool no_code = response_code_ < 1;
+    status_ = failed_exchange_status(response_code_);
     if (verdict == exchange_verdict::silent_unless_zero)
-        no_code = !reply_ && response_code_ == 0;
-    status_ = no_code ? QM_NO_RESPONSE : QM_UNUSABLE_RESPONSE;
+        status_ = !reply_ && response_code_ == 0 ? QM_NO_RESPONSE : QM_UNUSABLE_RESPONSE;
     if (verdict == exchange_verdict::with_message)
-        explain_failed_exchange();
-}
-
-void api_call::explain_failed_exchange()
-{
-    if (status_ == QM_NO_RESPONSE) {
-        *error_message_ = string_dup("Response error: no server HTTP response code received");
-        return;
-    }
-    constexpr size_t message_size = 64;
-    *error_message_ = static_cast<char *>(allocate_zeroed(message_size));
-    std::snprintf(*error_message_, message_size,
-                  "Response error: received server HTTP response code %li",
-                  static_cast<long>(response_code_));
+        *error_message_ = failed_exchange_message(response_code_).release();
 }
 
 } // namespace quillmere

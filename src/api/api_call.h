@@ -104,7 +104,6 @@ private:
     void refused(error_reading reading);
     void read_error_directly();
     void failed_exchange(exchange_verdict verdict);
-    void explain_failed_exchange();
 
     owned_buffer url_;
     char **error_message_;
