@@ -23,6 +23,17 @@ struct arguments {
     std::string ready_file;
     account_settings account;
     application_settings application;
+    content_settings content; // of put-content
+    content_settings preload; // of serving
+    bool dumps = false;
+};
+
+/** The commands that were defined, to see which was given. */
+struct command_set {
+    CLI::App *account;
+    CLI::App *application;
+    CLI::App *content;
+    CLI::App *reset;
 };
 
 void define_data(CLI::App &app, arguments &into)
@@ -54,6 +65,33 @@ void define_serving(CLI::App &app, arguments &into)
         ->type_name("N");
 }
 
+void define_state(CLI::App &app, arguments &into)
+{
+    auto *preload =
+        app.add_option("--preload", into.preload.from, "Folder to load before it serves")
+            ->type_name("DIR");
+    auto *account =
+        app.add_option("--account", into.preload.email, "E-mail address of whom it is loaded into")
+            ->type_name("ADDRESS");
+    preload->needs(account);
+    account->needs(preload);
+    app.add_flag("--dump", into.dumps, "Print accounts, trees and revisions as JSON, and end");
+}
+
+void define_limits(CLI::App &command, account_settings &into)
+{
+    const CLI::Range sizes(std::int64_t{0}, std::int64_t{1} << 50);
+    command.add_option("--base-storage", into.limits.base_storage, "Bytes of storage")
+        ->check(sizes)
+        ->type_name("N");
+    command.add_option("--bonus-storage", into.limits.bonus_storage, "Bytes of it beside those")
+        ->check(sizes)
+        ->type_name("N");
+    command.add_option("--bandwidth-limit", into.limits.bandwidth, "Bytes that it may serve")
+        ->check(sizes)
+        ->type_name("N");
+}
+
 CLI::App *define_account(CLI::App &app, arguments &into)
 {
     CLI::App *command = app.add_subcommand("add-account", "Make an account");
@@ -68,6 +106,11 @@ CLI::App *define_account(CLI::App &app, arguments &into)
         ->add_option("--facebook-token-file", into.account.facebook_token_file,
                      "File with the Facebook access token that also signs in to it")
         ->type_name("FILE");
+    command
+        ->add_option("--profile", into.account.profile, "A field of its profile; may be repeated")
+        ->allow_extra_args(false)
+        ->type_name("NAME=VALUE");
+    define_limits(*command, into.account);
     return command;
 }
 
@@ -85,18 +128,57 @@ CLI::App *define_application(CLI::App &app, arguments &into)
     return command;
 }
 
-void run_command(const CLI::App *account, const CLI::App *application, arguments &given)
+CLI::App *define_content(CLI::App &app, arguments &into)
+{
+    CLI::App *command =
+        app.add_subcommand("put-content", "Put a file, or what a folder holds, into an account");
+    define_data(*command, into);
+    command->add_option("--account", into.content.email, "The account's e-mail address")
+        ->required()
+        ->type_name("ADDRESS");
+    command->add_option("--path", into.content.path, "Where it goes, such as /photos/a.jpg")
+        ->required()
+        ->type_name("PATH");
+    command->add_option("--from", into.content.from, "The file or folder, - for standard input")
+        ->required()
+        ->type_name("FILE");
+    return command;
+}
+
+CLI::App *define_reset(CLI::App &app, arguments &into)
+{
+    CLI::App *command = app.add_subcommand("reset", "Empty the trees of all accounts");
+    define_data(*command, into);
+    return command;
+}
+
+void start_serving(const arguments &given)
+{
+    if (!given.preload.from.empty())
+        put_content(given.preload);
+    serve(given.serving);
+}
+
+void run_command(const command_set &commands, arguments &given)
 {
     const std::filesystem::path data =
         given.data.empty() ? default_data_directory() : std::filesystem::path(given.data);
     given.account.data = given.application.data = given.serving.data = data;
+    given.content.data = given.preload.data = data;
+    given.preload.path = "/";
     given.serving.ready_file = given.ready_file;
-    if (account->parsed())
+    if (commands.account->parsed())
         add_account(given.account);
-    else if (application->parsed())
+    else if (commands.application->parsed())
         add_application(given.application);
+    else if (commands.content->parsed())
+        put_content(given.content);
+    else if (commands.reset->parsed())
+        reset(data);
+    else if (given.dumps)
+        print_dump(data);
     else
-        serve(given.serving);
+        start_serving(given);
 }
 
 } // namespace
@@ -109,8 +191,9 @@ int run_command_line(int argc, char **argv)
     arguments given;
     define_data(app, given);
     define_serving(app, given);
-    const CLI::App *account = define_account(app, given);
-    const CLI::App *application = define_application(app, given);
+    define_state(app, given);
+    const command_set commands{define_account(app, given), define_application(app, given),
+                               define_content(app, given), define_reset(app, given)};
     app.require_subcommand(0, 1);
     try {
         app.parse(argc, argv);
@@ -118,7 +201,7 @@ int run_command_line(int argc, char **argv)
         return app.exit(problem) == 0 ? done : wrong_usage;
     }
     try {
-        run_command(account, application, given);
+        run_command(commands, given);
         return done;
     } catch (const std::exception &problem) {
         std::cerr << "quillmere-emulator: " << problem.what() << std::endl;

@@ -12,6 +12,7 @@
 #include <boost/beast/ssl.hpp>
 
 #include "errors.h"
+#include "file_body.h"
 #include "http_server.h"
 #include "router.h"
 
@@ -128,11 +129,30 @@ private:
     void respond()
     {
         http::request<http::string_body> message = body_->release();
-        const request asked{std::string(message.method_string()), std::string(message.target()),
+        const request asked{std::string(message.method_string()),
+                            std::string(message.target()),
                             std::string(message[http::field::content_type]),
-                            std::move(message.body())};
+                            std::move(message.body()),
+                            origin(message[http::field::host]),
+                            std::string(message[http::field::range]),
+                            std::string(message[http::field::if_range])};
         is_head_ = message.method() == http::verb::head;
         write(host_.handler(asked), message.version(), message.keep_alive() && !stopping_);
+    }
+
+    // Links lead back to where the client found the server. What is no name of a host is not
+    // repeated into them.
+    std::string origin(beast::string_view host)
+    {
+        const char *scheme = is_tls ? "https://" : "http://";
+        const bool is_host =
+            !host.empty() && host.find_first_not_of("abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRST"
+                                                    "UVWXYZ0123456789.-:[]") == host.npos;
+        if (is_host)
+            return scheme + std::string(host);
+        beast::error_code problem;
+        const auto here = socket_layer().socket().local_endpoint(problem);
+        return scheme + std::string("localhost:") + std::to_string(here.port());
     }
 
     // A client that breaks the protocol is told so, if it can still listen, and left.
@@ -158,24 +178,66 @@ private:
 
     void write(reply made, unsigned version, bool keep_alive)
     {
-        allow(host_.limits.exchange_time);
-        response_ = http::response<http::string_body>(http::status(made.http_status), version);
-        response_.set(http::field::server, "quillmere-emulator");
-        response_.set(http::field::content_type, "text/xml; charset=utf-8");
-        response_.set(http::field::cache_control, "no-store");
-        if (response_.result() == http::status::method_not_allowed)
-            response_.set(http::field::allow, "GET, HEAD, POST");
-        response_.keep_alive(keep_alive);
+        keep_alive_ = keep_alive;
+        if (made.file)
+            return write_file(std::move(made), version);
+        response_ = {};
+        begin(response_, made, version);
         response_.content_length(made.body.size());
         if (!is_head_)
             response_.body() = std::move(made.body);
-        http::async_write(
-            stream_, response_,
-            [self = this->shared_from_this(), keep_alive](beast::error_code problem, std::size_t) {
-                if (problem || !keep_alive)
-                    return self->close();
-                self->read_header();
+        allow(host_.limits.exchange_time);
+        http::async_write(stream_, response_,
+                          [self = this->shared_from_this()](beast::error_code problem,
+                                                            std::size_t) { self->sent(problem); });
+    }
+
+    template <class Response> void begin(Response &response, const reply &made, unsigned version)
+    {
+        response.result(http::status(made.http_status));
+        response.version(version);
+        response.set(http::field::server, "quillmere-emulator");
+        response.set(http::field::content_type, "text/xml; charset=utf-8");
+        response.set(http::field::cache_control, "no-store");
+        if (response.result() == http::status::method_not_allowed)
+            response.set(http::field::allow, "GET, HEAD, POST");
+        for (const header_field &each : made.fields)
+            response.set(each.name, each.value);
+        response.keep_alive(keep_alive_);
+    }
+
+    void write_file(reply made, unsigned version)
+    {
+        file_response_.emplace();
+        begin(*file_response_, made, version);
+        file_response_->content_length(made.file->length);
+        file_response_->body() = *made.file;
+        if (is_head_)
+            file_response_->body().length = 0;
+        file_writer_.emplace(*file_response_);
+        write_piece();
+    }
+
+    // Each piece has its own time: a large file may take long, a client that stalls may not.
+    void write_piece()
+    {
+        allow(host_.limits.exchange_time);
+        http::async_write_some(
+            stream_, *file_writer_,
+            [self = this->shared_from_this()](beast::error_code problem, std::size_t) {
+                if (!problem && !self->file_writer_->is_done())
+                    return self->write_piece();
+                self->file_writer_.reset();
+                self->file_response_.reset();
+                self->sent(problem);
             });
+    }
+
+    void sent(beast::error_code problem)
+    {
+        if (problem || !keep_alive_)
+            return close();
+        read_header();
     }
 
     void close()
@@ -215,10 +277,13 @@ private:
     std::optional<header_parser> header_;
     std::optional<body_parser> body_;
     http::response<http::string_body> response_;
+    std::optional<http::response<part_of_file>> file_response_;
+    std::optional<http::response_serializer<part_of_file>> file_writer_;
     std::array<char, 4096> discarded_{};
     std::uint64_t drained_ = 0;
     bool owes_reply_ = false;
     bool is_head_ = false;
+    bool keep_alive_ = false;
     bool stopping_ = false;
 };
 

@@ -17,6 +17,7 @@ public:
 
     const std::filesystem::path &path() const { return path_; }
     std::filesystem::path store() const { return path_ / "store.sqlite"; }
+    std::filesystem::path content() const { return path_ / "content"; }
     std::filesystem::path root_certificate() const { return path_ / "ca.pem"; }
     std::filesystem::path root_key() const { return path_ / "ca-key.pem"; }
     std::filesystem::path server_certificate() const { return path_ / "server.pem"; }

@@ -59,6 +59,26 @@ std::string sha1_hex(std::string_view text) { return hex(digest_of(text, EVP_sha
 
 std::string sha256(std::string_view text) { return digest_of(text, EVP_sha256()); }
 
+sha256_sum::sha256_sum() : context_(EVP_MD_CTX_new())
+{
+    if (!context_ || EVP_DigestInit_ex(context_.get(), EVP_sha256(), nullptr) != 1)
+        throw std::runtime_error("libcrypto made no digest");
+}
+
+void sha256_sum::add(std::string_view piece)
+{
+    if (EVP_DigestUpdate(context_.get(), piece.data(), piece.size()) != 1)
+        throw std::runtime_error("libcrypto made no digest");
+}
+
+std::string sha256_sum::finish_hex()
+{
+    std::string digest(static_cast<std::size_t>(EVP_MD_get_size(EVP_sha256())), '\0');
+    if (EVP_DigestFinal_ex(context_.get(), bytes_of(digest), nullptr) != 1)
+        throw std::runtime_error("libcrypto made no digest");
+    return hex(digest);
+}
+
 std::string random_bytes(std::size_t count)
 {
     std::string bytes(count, '\0');

@@ -2,8 +2,11 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <string_view>
+
+#include <openssl/evp.h>
 
 namespace emulator {
 
@@ -12,6 +15,22 @@ std::string sha1_hex(std::string_view text);
 
 /** The 32 bytes of the digest. Tokens are stored this way, so that the store gives none away. */
 std::string sha256(std::string_view text);
+
+/** The same digest of bytes that come piece by piece. */
+class sha256_sum {
+public:
+    sha256_sum();
+    void add(std::string_view piece);
+    /** 64 lower-case hexadecimal digits; nothing may be added afterwards. */
+    std::string finish_hex();
+
+private:
+    struct releaser {
+        void operator()(EVP_MD_CTX *context) const { EVP_MD_CTX_free(context); }
+    };
+
+    std::unique_ptr<EVP_MD_CTX, releaser> context_;
+};
 
 /** Unpredictable bytes, and the same written as lower-case hexadecimal digits, two for a byte. */
 std::string random_bytes(std::size_t count);

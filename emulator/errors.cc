@@ -20,6 +20,21 @@ const std::vector<error_row> &error_table()
         {error::signature_wrong, 403, "The signature is invalid"},
         {error::request_too_large, 413, "The request is too large"},
         {error::body_type_unsupported, 415, "The type of the request body is not supported"},
+        {error::folder_unknown, 404, "Unknown folder"},
+        {error::file_unknown, 404, "Unknown file"},
+        {error::access_denied, 403, "Access denied"},
+        {error::name_taken, 409, "The name is taken in that folder"},
+        {error::too_deep, 400, "The folders would be nested too deep"},
+        {error::storage_exceeded, 403, "The storage limit of the account is exceeded"},
+        {error::content_missing, 404, "The file has no content"},
+        {error::bandwidth_spent, 403, "The bandwidth of the account is spent"},
+        {error::into_itself, 400, "A folder cannot be put into itself"},
+        {error::is_root, 400, "This cannot be done with the root folder"},
+        {error::attachment_wrong, 409, "The folder is attached already, or is not"},
+        {error::daily_limit_reached, 403, "The limit of the day is reached"},
+        {error::link_unknown, 404, "Unknown link"},
+        {error::range_unsatisfiable, 416, "The file has no such range"},
+        {error::edit_impossible, 403, "A file of this type cannot be edited"},
     };
     return table;
 }

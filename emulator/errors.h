@@ -21,6 +21,21 @@ enum class error {
     signature_wrong = 109,
     request_too_large = 110,
     body_type_unsupported = 111,
+    folder_unknown = 112,
+    file_unknown = 113,
+    access_denied = 114,
+    name_taken = 115,
+    too_deep = 116,
+    storage_exceeded = 117,
+    content_missing = 118,
+    bandwidth_spent = 119,
+    into_itself = 120,
+    is_root = 121,
+    attachment_wrong = 122,
+    daily_limit_reached = 123,
+    link_unknown = 124,
+    range_unsatisfiable = 125,
+    edit_impossible = 126,
 };
 
 struct error_row {

@@ -10,12 +10,17 @@
 
 namespace emulator {
 
-enum class session_need { none, required };
+enum class session_need { none, optional, required };
+
+/** The transaction around a handler: its own affair, one that sees one state of the store, or one
+ * that makes all of its changes or none. */
+enum class store_use { own, reads, changes };
 
 /** One row of the endpoint table. The handler writes the elements between "action" and "result". */
 struct endpoint {
     const char *path;
     session_need session;
+    store_use use;
     void (*handle)(const call &, xml_writer &);
 };
 

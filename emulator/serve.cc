@@ -11,6 +11,7 @@
 #include "http_server.h"
 #include "ready_signal.h"
 #include "router.h"
+#include "store/content.h"
 #include "store/database.h"
 
 namespace emulator {
@@ -47,7 +48,8 @@ void serve(const serve_settings &settings)
     ensure_certificates(data, std::time(nullptr));
     asio::ssl::context tls = make_tls(data);
     database store(data.store());
-    service state{store, [] { return std::int64_t{std::time(nullptr)}; },
+    content_store content(data.content());
+    service state{store, content, [] { return std::int64_t{std::time(nullptr)}; },
                   settings.session_lifetime};
 
     asio::io_context context(1);

@@ -2,6 +2,7 @@
 
 #include "digest.h"
 #include "store/database.h"
+#include "store/folders.h"
 
 namespace emulator {
 namespace {
@@ -52,6 +53,7 @@ std::optional<std::int64_t> add_account(database &store, const new_account &made
         const std::int64_t account = insert_account(store, made, now);
         if (!made.facebook_token.empty())
             link_facebook(store, account, made.facebook_token);
+        make_root(store, account, now);
         change.commit();
         return account;
     } catch (const store_error &problem) {
@@ -94,6 +96,43 @@ std::string account_pkey(database &store, std::int64_t account)
 std::uint64_t account_revision(database &store, std::int64_t account)
 {
     return static_cast<std::uint64_t>(account_row(store, "revision", account).number(0));
+}
+
+std::uint64_t account_epoch(database &store, std::int64_t account)
+{
+    return static_cast<std::uint64_t>(account_row(store, "epoch", account).number(0));
+}
+
+std::string account_email(database &store, std::int64_t account)
+{
+    return account_row(store, "email", account).text(0);
+}
+
+std::int64_t account_created(database &store, std::int64_t account)
+{
+    return account_row(store, "created", account).number(0);
+}
+
+std::optional<std::int64_t> find_account(database &store, std::string_view email)
+{
+    statement query = store.prepare("SELECT id FROM accounts WHERE email = ?");
+    if (!query.bind(email).step())
+        return std::nullopt;
+    return query.number(0);
+}
+
+void put_account_limits(database &store, std::int64_t account, const account_limits &limits)
+{
+    constexpr std::int64_t unchanged = -1;
+    store
+        .prepare("UPDATE accounts SET"
+                 " base_storage = CASE ?2 WHEN -1 THEN base_storage ELSE ?2 END,"
+                 " bonus_storage = CASE ?3 WHEN -1 THEN bonus_storage ELSE ?3 END,"
+                 " bandwidth_limit = CASE ?4 WHEN -1 THEN bandwidth_limit ELSE ?4 END"
+                 " WHERE id = ?1")
+        .bind(account, limits.base_storage.value_or(unchanged),
+              limits.bonus_storage.value_or(unchanged), limits.bandwidth.value_or(unchanged))
+        .run();
 }
 
 } // namespace emulator

@@ -101,7 +101,10 @@ void database::execute(const std::string &sql)
         fail(handle_.get());
 }
 
-transaction::transaction(database &in) : database_(in) { database_.execute("BEGIN IMMEDIATE"); }
+transaction::transaction(database &in, transaction_kind kind) : database_(in)
+{
+    database_.execute(kind == transaction_kind::writes ? "BEGIN IMMEDIATE" : "BEGIN");
+}
 
 transaction::~transaction()
 {

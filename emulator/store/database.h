@@ -83,11 +83,14 @@ private:
     std::unique_ptr<sqlite3, closer> handle_;
 };
 
+enum class transaction_kind { writes, reads };
+
 /** All or nothing: what was not committed by the end of the scope is undone. */
 class transaction {
 public:
-    /** Takes the write lock at once, so that two processes never meet halfway. */
-    explicit transaction(database &in);
+    /** One that writes takes the write lock at once, so that two processes never meet halfway; one
+     * that reads sees the store as it was at its first look. */
+    explicit transaction(database &in, transaction_kind kind = transaction_kind::writes);
     ~transaction();
     transaction(const transaction &) = delete;
     transaction &operator=(const transaction &) = delete;

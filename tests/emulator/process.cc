@@ -112,6 +112,35 @@ std::uint16_t server_process::port_after(const std::string &key) const
     return static_cast<std::uint16_t>(std::stoul(ready_line_.substr(at + key.size())));
 }
 
+fed_process::fed_process(const std::vector<std::string> &arguments)
+{
+    int ends[2];
+    if (::pipe2(ends, O_CLOEXEC) != 0)
+        throw std::runtime_error("pipe2");
+    const emulator::descriptor reading(ends[0]);
+    writing_ = std::make_unique<emulator::descriptor>(ends[1]);
+    file_actions files;
+    files.give(STDIN_FILENO, reading.number());
+    files.open(STDOUT_FILENO, "/dev/null", O_WRONLY);
+    id_ = spawn(arguments, files);
+}
+
+fed_process::~fed_process()
+{
+    if (id_ > 0)
+        kill();
+}
+
+void fed_process::feed(const std::string &bytes) { emulator::write_all(writing_->number(), bytes); }
+
+void fed_process::kill()
+{
+    if (id_ <= 0)
+        throw std::logic_error("the process has ended already");
+    ::kill(id_, SIGKILL);
+    wait_for(std::exchange(id_, -1));
+}
+
 finished_process run_program(const std::vector<std::string> &arguments, const std::string &input)
 {
     const scratch_directory scratch;

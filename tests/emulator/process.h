@@ -3,10 +3,13 @@
 
 #include <cstdint>
 #include <filesystem>
+#include <memory>
 #include <string>
 #include <vector>
 
 #include <sys/types.h>
+
+#include "files.h"
 
 /** A server process on ports of the kernel's choice. It has told that it listens when the
  * constructor returns, and is killed at the end unless it was stopped. */
@@ -34,6 +37,25 @@ private:
 
     pid_t id_ = -1;
     std::string ready_line_;
+};
+
+/** The program with a pipe as its standard input, for as long as the test likes. */
+class fed_process {
+public:
+    explicit fed_process(const std::vector<std::string> &arguments);
+    ~fed_process();
+    fed_process(const fed_process &) = delete;
+    fed_process &operator=(const fed_process &) = delete;
+
+    pid_t id() const { return id_; }
+    /** Returns when all of it but what a pipe holds has been read. */
+    void feed(const std::string &bytes);
+    /** Kills it and waits for its end. */
+    void kill();
+
+private:
+    pid_t id_ = -1;
+    std::unique_ptr<emulator::descriptor> writing_;
 };
 
 struct finished_process {

@@ -10,6 +10,7 @@
 #include "socket_client.h"
 #include "store/accounts.h"
 #include "store/applications.h"
+#include "store/content.h"
 #include "store/database.h"
 
 using namespace emulator;
@@ -44,7 +45,8 @@ protected:
     scratch_directory scratch;
     database store{scratch.path() / "store.sqlite"};
     std::int64_t time = 1000;
-    service state{store, [this] { return time; }, 600};
+    content_store content{scratch.path() / "content"};
+    service state{store, content, [this] { return time; }, 600};
 };
 
 std::string number_of(const reply &made) { return element(made.body, "error"); }

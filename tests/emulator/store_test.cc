@@ -9,6 +9,7 @@
 #include "store/accounts.h"
 #include "store/applications.h"
 #include "store/database.h"
+#include "store/folders.h"
 #include "store/sessions.h"
 
 using namespace emulator;
@@ -64,6 +65,25 @@ TEST_F(Store, OfALaterVersionIsLeftAlone)
     store.execute("PRAGMA user_version = 1000000");
 
     EXPECT_THROW(database{file}, store_error);
+}
+
+TEST_F(Store, OfTheFirstVersionIsBroughtUpToDate)
+{
+    account();
+    for (const char *table :
+         {"one_time_links", "feed", "attachments", "files", "folders", "profile_fields"})
+        store.execute(std::string("DROP TABLE ") + table);
+    for (const char *column : {"epoch", "base_storage", "bonus_storage", "bandwidth_limit",
+                               "bandwidth_used", "use_day", "streamed_today", "one_time_today"})
+        store.execute(std::string("ALTER TABLE accounts DROP COLUMN ") + column);
+    store.execute("PRAGMA user_version = 1");
+
+    database again(file);
+
+    const auto ann = authenticate(again, "ann@example.org", "password");
+    ASSERT_TRUE(ann);
+    EXPECT_EQ(root_of(again, *ann).key.size(), 13u);
+    EXPECT_EQ(account_epoch(again, *ann), 1u);
 }
 
 TEST_F(Store, RefusesAFileThatIsNoDatabase)
