@@ -49,9 +49,8 @@ std::string facts_as_json(const std::vector<fact> &facts)
     return json_line(document);
 }
 
-results::results()
+results::results() : output_(::fcntl(STDOUT_FILENO, F_DUPFD_CLOEXEC, STDERR_FILENO + 1))
 {
-    output_ = descriptor(::fcntl(STDOUT_FILENO, F_DUPFD_CLOEXEC, STDERR_FILENO + 1));
     terminal_ = ::isatty(output_.number()) == 1;
     const descriptor nowhere(::open("/dev/null", O_WRONLY | O_CLOEXEC));
     if (nowhere)

@@ -208,6 +208,8 @@ struct service_error {
     std::optional<std::string> message;
 };
 
+void PrintTo(const service_error &each, std::ostream *out) { *out << each.inside; }
+
 class RefusedOperation : public library_test,
                          public testing::WithParamInterface<std::tuple<operation, service_error>> {
 };

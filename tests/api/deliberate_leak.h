@@ -1,4 +1,5 @@
-// Tells the leak checker of what the library leaves behind on purpose.
+// Tells the leak checker of what the library leaves behind on purpose. deliberate_leak.supp tells
+// valgrind.
 #pragma once
 
 #if defined(__has_feature)

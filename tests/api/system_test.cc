@@ -219,6 +219,8 @@ struct revision_text {
     uint64_t revision;
 };
 
+void PrintTo(const revision_text &each, std::ostream *out) { *out << each.element; }
+
 class DeviceRevision : public DeviceStatus, public testing::WithParamInterface<revision_text> {};
 
 TEST_P(DeviceRevision, IsTheNumberThatTheTextBeginsWith)
@@ -247,6 +249,8 @@ struct jobs_text {
     const char *element;
     int32_t flag;
 };
+
+void PrintTo(const jobs_text &each, std::ostream *out) { *out << each.element; }
 
 class AsyncJobs : public DeviceStatus, public testing::WithParamInterface<jobs_text> {};
 

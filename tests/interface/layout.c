@@ -4,40 +4,42 @@
 #include "quillmere.h"
 
 /* clang-format off */
-#define OFFSET(type, field, expected) {#type "." #field, offsetof(type, field), expected}
+#define FIELD(type, field, offset, size)                               \
+    {"offset of " #type "." #field, offsetof(type, field), offset},    \
+    {"size of " #type "." #field, sizeof(((type *)0)->field), size}
 #define SIZE(type, expected) {"size of " #type, sizeof(type), expected}
 /* clang-format on */
 
 const struct layout_entry layout_entries[] = {
-    OFFSET(transfer_settings, path, 0),
-    OFFSET(transfer_settings, default_timeout, 8),
-    OFFSET(transfer_settings, connection_attempts, 16),
+    FIELD(transfer_settings, path, 0, 8),
+    FIELD(transfer_settings, default_timeout, 8, 8),
+    FIELD(transfer_settings, connection_attempts, 16, 4),
     SIZE(transfer_settings, 24),
 
-    OFFSET(proxy_settings, enabled, 0),
-    OFFSET(proxy_settings, host, 8),
-    OFFSET(proxy_settings, user, 16),
-    OFFSET(proxy_settings, password, 24),
-    OFFSET(proxy_settings, port, 32),
+    FIELD(proxy_settings, enabled, 0, 4),
+    FIELD(proxy_settings, host, 8, 8),
+    FIELD(proxy_settings, user, 16, 8),
+    FIELD(proxy_settings, password, 24, 8),
+    FIELD(proxy_settings, port, 32, 8),
     SIZE(proxy_settings, 40),
 
-    OFFSET(string_buffer, length, 0),
-    OFFSET(string_buffer, capacity, 8),
-    OFFSET(string_buffer, bytes, 16),
-    OFFSET(string_buffer, redaction_ranges, 24),
-    OFFSET(string_buffer, redacted_copy, 32),
+    FIELD(string_buffer, length, 0, 8),
+    FIELD(string_buffer, capacity, 8, 8),
+    FIELD(string_buffer, bytes, 16, 8),
+    FIELD(string_buffer, redaction_ranges, 24, 8),
+    FIELD(string_buffer, redacted_copy, 32, 8),
     SIZE(string_buffer, 40),
 
-    OFFSET(redaction_range, start, 0),
-    OFFSET(redaction_range, end, 8),
-    OFFSET(redaction_range, next, 16),
+    FIELD(redaction_range, start, 0, 8),
+    FIELD(redaction_range, end, 8, 8),
+    FIELD(redaction_range, next, 16, 8),
     SIZE(redaction_range, 24),
 
-    OFFSET(node_value_state, sought, 0),
-    OFFSET(node_value_state, value, 8),
-    OFFSET(node_value_state, collecting, 16),
-    OFFSET(node_value_state, depth, 20),
-    OFFSET(node_value_state, path, 24),
+    FIELD(node_value_state, sought, 0, 8),
+    FIELD(node_value_state, value, 8, 8),
+    FIELD(node_value_state, collecting, 16, 4),
+    FIELD(node_value_state, depth, 20, 4),
+    FIELD(node_value_state, path, 24, 8),
     SIZE(node_value_state, 32),
 
     SIZE(ssl_disabled, 4),

@@ -1,6 +1,7 @@
 // The exported variables as they come, and the setters of the transfers.
 #include <gtest/gtest.h>
 
+#include <ostream>
 #include <string>
 
 #include "quillmere.h"
@@ -86,6 +87,11 @@ struct timeout_case {
     bool accepted;
 };
 
+std::ostream &operator<<(std::ostream &out, const timeout_case &timeout)
+{
+    return out << timeout.seconds;
+}
+
 class DefaultTimeout : public Configuration, public testing::WithParamInterface<timeout_case> {};
 
 TEST_P(DefaultTimeout, IsAtLeastOneSecond)
@@ -121,6 +127,11 @@ struct attempts_case {
     int32_t attempts;
     bool accepted;
 };
+
+std::ostream &operator<<(std::ostream &out, const attempts_case &attempts)
+{
+    return out << attempts.attempts;
+}
 
 class ConnectionAttempts : public Configuration,
                            public testing::WithParamInterface<attempts_case> {};

@@ -3,6 +3,7 @@
 
 #include <cstddef>
 
+#include "interpose/heap.h"
 #include "quillmere.h"
 #include "runtime/lifecycle.h"
 #include "support/globals_guard.h"
@@ -113,6 +114,21 @@ TEST_F(EventHandler, IsForgottenByANewStart)
     api_global_init(nullptr);
 
     EXPECT_EQ(event_handler->function, nullptr);
+}
+
+TEST_F(EventHandler, IsForgottenByASecondStartWithoutAStop)
+{
+    api_global_init(nullptr);
+    install_event_handler(first_handler, nullptr);
+    int64_t before = blocks_held();
+    tls_init();
+    int64_t for_the_locks = blocks_held() - before;
+    before = blocks_held();
+
+    api_global_init(nullptr);
+
+    EXPECT_EQ(event_handler->function, nullptr);
+    EXPECT_EQ(blocks_held(), before + for_the_locks);
 }
 
 } // namespace

@@ -74,6 +74,8 @@ TEST_F(Exhaustion, LeavesTlsInitWithoutLocks)
 {
     pretended_libcurl libcurl;
     libcurl.ssl_version = "OpenSSL/3.0.11";
+    pthread_mutex_t *mutexes_before = quillmere::tls_mutexes;
+    int32_t installed_before = quillmere::tls_locks_installed;
     int32_t result = 0;
 
     {
@@ -82,14 +84,19 @@ TEST_F(Exhaustion, LeavesTlsInitWithoutLocks)
     }
 
     EXPECT_EQ(result, -1);
-    EXPECT_EQ(quillmere::tls_mutexes, nullptr);
-    EXPECT_EQ(quillmere::tls_locks_installed, 0);
+    EXPECT_EQ(quillmere::tls_mutexes, mutexes_before);
+    EXPECT_EQ(quillmere::tls_locks_installed, installed_before);
     EXPECT_EQ(log.text(), log_up_to_the_locks(log.text()) +
                               "Mutex locks requested: 1.\nUnable to create mutexes.\n");
     EXPECT_EQ(log.text().find("Curl SSL version: OpenSSL/3.0.11\nOpenSSL version: "), 0u);
 }
 
-class RepeatedTlsInit : public Exhaustion, public testing::WithParamInterface<size_t> {};
+struct shortage {
+    size_t allowed;
+    size_t refused;
+};
+
+class RepeatedTlsInit : public Exhaustion, public testing::WithParamInterface<shortage> {};
 
 TEST_P(RepeatedTlsInit, KeepsTheEarlierLocksWhenItFindsNoRoom)
 {
@@ -101,7 +108,7 @@ TEST_P(RepeatedTlsInit, KeepsTheEarlierLocksWhenItFindsNoRoom)
     int32_t result = 0;
 
     {
-        starved_heap starved(GetParam());
+        starved_heap starved(GetParam().allowed, GetParam().refused);
         result = tls_init();
     }
 
@@ -110,19 +117,21 @@ TEST_P(RepeatedTlsInit, KeepsTheEarlierLocksWhenItFindsNoRoom)
     EXPECT_EQ(blocks_held(), held);
 }
 
-INSTANTIATE_TEST_SUITE_P(AllowedAllocations, RepeatedTlsInit, testing::Values(0, 1));
+INSTANTIATE_TEST_SUITE_P(Shortages, RepeatedTlsInit,
+                         testing::Values(shortage{0, 1}, shortage{1, 1}, shortage{0, 2}));
 
 TEST_F(Exhaustion, OfTheLocksDoesNotStopTheStart)
 {
     pretended_libcurl libcurl;
     libcurl.ssl_version = "OpenSSL/3.0.11";
+    pthread_mutex_t *mutexes_before = quillmere::tls_mutexes;
 
     {
         starved_heap starved(0, 1);
         api_global_init("/somewhere/roots.pem");
     }
 
-    EXPECT_EQ(quillmere::tls_mutexes, nullptr);
+    EXPECT_EQ(quillmere::tls_mutexes, mutexes_before);
     EXPECT_NE(quillmere::event_handler, nullptr);
     EXPECT_STREQ(ca_cert_pem_path.path, "/somewhere/roots.pem");
     api_global_cleanup();

@@ -8,10 +8,19 @@
 #include <curl/curl.h>
 #include <openssl/crypto.h>
 
+#include "interpose/heap.h"
 #include "interpose/libcurl.h"
 #include "quillmere.h"
 #include "runtime/tls_locks.h"
 #include "support/log_capture.h"
+
+// Two tests make the callbacks fail on purpose, by unlocking what is not locked, which the thread
+// sanitizer would report. It asks this function, if there is one, what to leave out.
+extern "C" const char *__tsan_default_suppressions();
+extern "C" const char *__tsan_default_suppressions()
+{
+    return "mutex:tls_locking_callback\nmutex:dynamic_lock_callback\n";
+}
 
 namespace quillmere_test {
 namespace {
@@ -55,14 +64,16 @@ protected:
 TEST_P(OtherTlsLibrary, IsNamedAndGetsNoLocks)
 {
     libcurl.ssl_version = GetParam();
+    pthread_mutex_t *mutexes_before = tls_mutexes;
+    int32_t installed_before = tls_locks_installed;
 
     int32_t result = tls_init();
 
     EXPECT_EQ(result, 0);
     EXPECT_EQ(log.text(),
               std::string("Curl SSL version: ") + GetParam() + "\nNo OpenSSL support.\n");
-    EXPECT_EQ(tls_mutexes, nullptr);
-    EXPECT_EQ(tls_locks_installed, 0);
+    EXPECT_EQ(tls_mutexes, mutexes_before);
+    EXPECT_EQ(tls_locks_installed, installed_before);
 }
 
 INSTANTIATE_TEST_SUITE_P(Versions, OtherTlsLibrary,
@@ -211,6 +222,17 @@ protected:
 };
 
 TEST_F(DynamicLock, IsOneMutex) { EXPECT_EQ(sizeof *lock, sizeof(pthread_mutex_t)); }
+
+TEST(DynamicLockMemory, IsOneBlockThatIsGivenBack)
+{
+    int64_t before = blocks_held();
+
+    CRYPTO_dynlock_value *lock = dynamic_lock_create_callback(__FILE__, __LINE__);
+    EXPECT_EQ(blocks_held(), before + 1);
+
+    dynamic_lock_destroy_callback(lock, __FILE__, __LINE__);
+    EXPECT_EQ(blocks_held(), before);
+}
 
 TEST_F(DynamicLock, IsLockedAndUnlocked)
 {

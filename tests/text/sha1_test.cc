@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <ostream>
 #include <string>
 
 #include "quillmere.h"
@@ -13,6 +14,11 @@ struct digest_case {
     std::string data;
     const char *digest;
 };
+
+std::ostream &operator<<(std::ostream &out, const digest_case &digest)
+{
+    return out << digest.data.size() << " bytes";
+}
 
 class Sha1 : public testing::TestWithParam<digest_case> {};
 

@@ -1,6 +1,4 @@
 // What is asked and what is answered, as long as the network does its part.
-#include <cstdlib>
-
 #include "support/library_fixture.h"
 #include "support/temporary_folder.h"
 #include "transport/exchange.h"

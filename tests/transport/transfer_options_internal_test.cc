@@ -121,6 +121,8 @@ struct timeout_case {
     long seconds;
 };
 
+void PrintTo(const timeout_case &each, std::ostream *out) { *out << each.argument; }
+
 class TransferTimeOut : public TransferOptions, public testing::WithParamInterface<timeout_case> {};
 
 TEST_P(TransferTimeOut, IsTheArgumentOrTheDefault)
@@ -314,6 +316,8 @@ struct rounding {
     int32_t milliseconds;
     long seconds;
 };
+
+void PrintTo(const rounding &each, std::ostream *out) { *out << each.milliseconds; }
 
 class ProbeTimeOut : public TransferOptions, public testing::WithParamInterface<rounding> {};
 

@@ -207,6 +207,11 @@ struct mismatch {
     const char *expected;
 };
 
+void PrintTo(const mismatch &each, std::ostream *out)
+{
+    *out << '"' << each.received << "\" for \"" << each.expected << '"';
+}
+
 class MismatchedBody : public BodyProbe, public testing::WithParamInterface<mismatch> {};
 
 TEST_P(MismatchedBody, IsLoggedBesideTheExpectedOne)

@@ -1,7 +1,13 @@
 // Which text a lookup finds in a document.
 #include "xml/lookup.h"
 
+#include <stdio.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <gtest/gtest.h>
+
+#include <vector>
 
 #include "support/log_capture.h"
 #include "support/stdout_capture.h"
@@ -233,17 +239,60 @@ INSTANTIATE_TEST_SUITE_P(
                            "<title>Log in</title></head></html>",
                            std::nullopt}));
 
-TEST(MalformedDocumentLog, FlushesStandardOutputToo)
+// A log that looks, at each of its lines, how much of standard output has got through, and then
+// prints a byte more there.
+class stdout_watching_log {
+public:
+    stdout_watching_log()
+    {
+        stream_ = ::fopencookie(this, "w", {nullptr, note_line, nullptr, nullptr});
+        set_quillmere_output_file(stream_);
+    }
+    ~stdout_watching_log()
+    {
+        set_quillmere_output_file(nullptr);
+        std::fclose(stream_);
+    }
+    stdout_watching_log(const stdout_watching_log &) = delete;
+    stdout_watching_log &operator=(const stdout_watching_log &) = delete;
+
+    // How many bytes had got through at each line, and at last.
+    std::vector<size_t> lengths() const
+    {
+        std::vector<size_t> all = lengths_;
+        all.push_back(got_through());
+        return all;
+    }
+
+private:
+    static ssize_t note_line(void *log, const char *, size_t length)
+    {
+        auto *self = static_cast<stdout_watching_log *>(log);
+        self->lengths_.push_back(got_through());
+        std::fputc('x', stdout);
+        return static_cast<ssize_t>(length);
+    }
+
+    // For a standard output that is a file.
+    static size_t got_through()
+    {
+        struct stat found = {};
+        ::fstat(STDOUT_FILENO, &found);
+        return static_cast<size_t>(found.st_size);
+    }
+
+    std::FILE *stream_;
+    std::vector<size_t> lengths_;
+};
+
+TEST(MalformedDocumentLog, FlushesStandardOutputAfterEachOfItsLines)
 {
-    // Three lines go to the log, while standard output holds back what the program printed.
-    log_capture log;
     stdout_capture out;
-    std::setvbuf(stdout, nullptr, _IOFBF, BUFSIZ);
-    std::fputs("printed before", stdout);
+    stdout_watching_log log;
 
     look_up("not XML", "a");
 
-    EXPECT_EQ(out.text(), "printed before");
+    EXPECT_EQ(log.lengths(), (std::vector<size_t>{0, 1, 2, 3}));
 }
 
 } // namespace
