@@ -25,7 +25,7 @@ std::optional<live_session> find_session(database &store, std::string_view diges
 std::string insert_token(database &store, const std::string &table, std::int64_t account,
                          session_time time)
 {
-    const std::string token = random_hex(token_bytes);
+    std::string token = random_hex(token_bytes);
     const std::string digest = sha256(token);
     store.prepare("DELETE FROM " + table + " WHERE expires <= ?").bind(time.now).run();
     store.prepare("INSERT INTO " + table + " (token_digest, account, expires) VALUES (?, ?, ?)")
