@@ -807,7 +807,7 @@ QM_API void file_links_delete(file_links **record);
  *   <kind>_list_new        makes an empty list;
  *   add_to_<kind>_list     hands a record over to a list; does nothing if either is NULL;
  *   delete_all_<kind>_list deletes *list with all its records, and deliberately leaves the pointer
- * as it was. NULL, or a pointer to NULL, does nothing.
+ *                          as it was. NULL, or a pointer to NULL, does nothing.
  * ---------------------------------------------------------------------------------------------- */
 
 /** A node of a list of files. */
@@ -816,6 +816,7 @@ typedef struct file_list {
     struct file_list *next; /**< NULL at the end. */
 } file_list;
 
+/** Makes such a list, hands a record over to it, deletes it with its records; see above. */
 QM_API file_list *file_info_list_new(void);
 QM_API void add_to_file_list(file_list *list, file_info *record);
 QM_API void delete_all_file_list(file_list **list);
@@ -826,6 +827,7 @@ typedef struct folder_list {
     struct folder_list *next; /**< NULL at the end. */
 } folder_list;
 
+/** Makes such a list, hands a record over to it, deletes it with its records; see above. */
 QM_API folder_list *folder_info_list_new(void);
 QM_API void add_to_folder_list(folder_list *list, folder_info *record);
 QM_API void delete_all_folder_list(folder_list **list);
@@ -836,6 +838,7 @@ typedef struct change_list {
     struct change_list *next; /**< NULL at the end. */
 } change_list;
 
+/** Makes such a list, hands a record over to it, deletes it with its records; see above. */
 QM_API change_list *change_list_new(void);
 QM_API void add_to_change_list(change_list *list, change_info *record);
 QM_API void delete_all_change_list(change_list **list);
@@ -846,6 +849,7 @@ typedef struct file_links_list {
     struct file_links_list *next; /**< NULL at the end. */
 } file_links_list;
 
+/** Makes such a list, hands a record over to it, deletes it with its records; see above. */
 QM_API file_links_list *file_links_list_new(void);
 QM_API void add_to_file_links_list(file_links_list *list, file_links *record);
 QM_API void delete_all_file_links_list(file_links_list **list);
@@ -884,9 +888,10 @@ QM_API void key_value_delete(key_value *list);
  *
  * Each takes a reply and its length, of which only the low 32 bits count, and lists of the
  * caller's, and makes one record for each entry, in the reply's order. An entry's texts are those
- * of the elements right inside it; an element that occurs twice has its texts joined. They return 1
- * if the reply is not well-formed, else 0; the records finished before the damage stay in the lists
- * and are counted. A reply that is NULL or of length 0 returns 0 and touches nothing. Any thread.
+ * of the elements inside it, at any depth; an element that occurs twice has its texts joined. They
+ * return 1 if the reply is not well-formed, else 0; the records finished before the damage stay in
+ * the lists and are counted. A reply that is NULL or of length 0 returns 0 and touches nothing. Any
+ * thread.
  *
  * The callbacks below are expat's, for a start tag, an end tag and text, and take the state of
  * their extractor.
@@ -1096,7 +1101,7 @@ QM_API int32_t get_user_limits(const char *session_token, user_limits **limits,
  * @param revision      receives the revision as text, or NULL; the caller frees it
  * @param epoch         receives the epoch as text, or NULL; the caller frees it
  * @return a status; QM_OK needs only one of the two, and QM_UNUSABLE_RESPONSE means that neither
- * came. A negative response code counts as QM_UNUSABLE_RESPONSE here
+ *         came. A negative response code counts as QM_UNUSABLE_RESPONSE here
  *
  * Deliberately, nothing is logged, and transport failures have no message.
  */
@@ -1137,7 +1142,7 @@ QM_API int32_t get_folder_info(const char *session_token, const char *folder_key
  * @param parent_key    folder to create it in; NULL or "" for the account's root
  * @param mtime         modification time; NULL or "" for none
  * @param folder_key    receives the new folder's key, or NULL if the call failed or the reply named
- * none; the caller frees it
+ *                      none; the caller frees it
  */
 QM_API int32_t create_folder(const char *session_token, const char *name, const char *parent_key,
                              const char *mtime, char **folder_key, char **error_message);
@@ -1168,9 +1173,9 @@ QM_API int32_t update_folder(const char *session_token, const char *folder_key, 
  * @param session_token   the session
  * @param source_key      the folder to copy, sent as it is
  * @param destination_key the receiving folder, sent as it is, or NULL to leave it out of the
- * request
+ *                        request
  * @param new_folder_key  receives the key of the copy, or NULL if the call failed or the reply
- * named none; the caller frees it
+ *                        named none; the caller frees it
  * @return a status, QM_NO_ERROR_ELEMENT among them
  */
 QM_API int32_t copy_folder(const char *session_token, const char *source_key,
@@ -1183,7 +1188,7 @@ QM_API int32_t copy_folder(const char *session_token, const char *source_key,
  * @param session_token   the session
  * @param source_key      the folder to move, sent as it is
  * @param destination_key the receiving folder, sent as it is, or NULL to leave it out of the
- * request
+ *                        request
  * @return a status, QM_NO_ERROR_ELEMENT among them
  */
 QM_API int32_t move_folder(const char *session_token, const char *source_key,
@@ -1191,8 +1196,7 @@ QM_API int32_t move_folder(const char *session_token, const char *source_key,
 
 /**
  * Reads one chunk of a folder's listing. All texts are sent as they are; each may be NULL, which
- * leaves it out, while
- * "" is sent.
+ * leaves it out, while "" is sent.
  *
  * @param session_token the session
  * @param folder_key    the folder
@@ -1201,14 +1205,14 @@ QM_API int32_t move_folder(const char *session_token, const char *source_key,
  * @param content_type  the kind of entries asked for
  * @param error_message deliberately ahead of the results
  * @param folders       receives the chunk's folders, or NULL if there are none; the caller deletes
- * the list
+ *                      the list
  * @param folder_count  receives their number
  * @param files         receives the chunk's files, or NULL if there are none; the caller deletes
- * the list
+ *                      the list
  * @param file_count    receives their number
  * @param chunk_size    receives the most entries that a chunk holds, 100 if the reply does not say
  * @return a status, QM_NO_ERROR_ELEMENT among them. With QM_MALFORMED_REPLY both lists are NULL,
- * but the numbers may have been set
+ *         but the numbers may have been set
  */
 QM_API int32_t get_folder_content(const char *session_token, const char *folder_key,
                                   const char *device_id, const char *chunk,
@@ -1256,7 +1260,7 @@ QM_API int32_t get_file_info(const char *quick_key, const char *session_token, c
  * @param parent_key     folder to create it in, or NULL
  * @param mtime          modification time; NULL or "" for none
  * @param quick_key      receives the new file's key, or NULL if the call failed or the reply named
- * none; the caller frees it
+ *                       none; the caller frees it
  */
 QM_API int32_t create_file(const char *session_token, const char *filename,
                            const char *file_extension, const char *parent_key, const char *mtime,
@@ -1272,7 +1276,7 @@ QM_API int32_t delete_file(const char *session_token, const char *quick_key, cha
  * @param quick_key     the file, sent as it is
  * @param folder_key    the receiving folder, or NULL to leave it out of the request
  * @param new_quick_key receives the key of the copy, or NULL if the call failed or the reply named
- * none; the caller frees it
+ *                      none; the caller frees it
  */
 QM_API int32_t copy_file(const char *session_token, const char *quick_key, const char *folder_key,
                          char **new_quick_key, char **error_message);
@@ -1309,13 +1313,13 @@ QM_API int32_t get_links(const char *quick_key, const char *link_type, const cha
  * @param session_token          the session
  * @param quick_key              the file, sent as it is
  * @param download_url           receives the link, or NULL if there is none; a link without a
- * scheme is given "http". The caller frees it
+ *                               scheme is given "http". The caller frees it
  * @param free_bandwidth         receives the bandwidth that is left for free downloads, or 0
  * @param error_message          deliberately between the two pairs of results
  * @param download_error         receives the number of a refusal of the download, or 0
  * @param download_error_message receives that refusal's message or NULL; the caller frees it
  * @return a status; QM_OK says nothing of the link: see download_url and download_error. With
- * QM_MALFORMED_REPLY the two texts are NULL, but the numbers may have been set
+ *         QM_MALFORMED_REPLY the two texts are NULL, but the numbers may have been set
  */
 QM_API int32_t get_download_link(const char *session_token, const char *quick_key,
                                  char **download_url, int32_t *free_bandwidth, char **error_message,
@@ -1332,11 +1336,11 @@ extern QM_API const char *get_device_changes_uri; /**< "/api/device/get_changes.
  * @param device_id       id of the device
  * @param device_revision receives the account's revision now, or 0
  * @param changes         receives the list of changes, which may be empty, or NULL; the caller
- * deletes it. With QM_MALFORMED_REPLY, deliberately, it may point to a list that has been deleted
- * already: do not touch it
+ *                        deletes it. With QM_MALFORMED_REPLY, deliberately, it may point to a list
+ *                        that has been deleted already: do not touch it
  * @param change_count    receives the number of changes
  * @param block_size      receives the number of revisions of which the service hands out changes at
- * once, or 0
+ *                        once, or 0
  *
  * With QM_MALFORMED_REPLY the numbers may have been set.
  */
