@@ -9,16 +9,16 @@
  * Conventions that hold throughout, unless a function says otherwise:
  *
  *   - Text is NUL-terminated UTF-8. Text that is handed out is plain malloc memory of the caller's,
- * released with free() or api_free(). What a getter returns is borrowed from its record.
+ *     released with free() or api_free(). What a getter returns is borrowed from its record.
  *   - An out-parameter must not be NULL. Operations reset theirs before anything else happens.
  *   - Operations return a status: QM_OK, the service's own error number (positive), or a negative
- * qm_status.
+ *     qm_status.
  *   - Threads: a function that says "any thread" may run on several threads at once, each with
- * arguments of its own. One that says "configuration" is for one thread while no request is
- * running. A function that works on a string buffer or record belongs to whichever thread holds
- * that object, one at a time.
+ *     arguments of its own. One that says "configuration" is for one thread while no request is
+ *     running. A function that works on a string buffer or record belongs to whichever thread holds
+ *     that object, one at a time.
  *   - Memory: when the heap is exhausted the library writes one line to standard error and aborts,
- * except where a function names another outcome.
+ *     except where a function names another outcome.
  */
 #ifndef QUILLMERE_H
 #define QUILLMERE_H
@@ -51,15 +51,13 @@ extern "C" {
 
 /** What an operation returns besides the service's own error numbers, which are positive. */
 typedef enum qm_status {
-    QM_OK = 0, /**< The service answered "Success". */
-    QM_NO_ERROR_ELEMENT =
-        -1, /**< Refused without an "error" element (operations that read it directly). */
+    QM_OK = 0,                 /**< The service answered "Success". */
+    QM_NO_ERROR_ELEMENT = -1,  /**< Refused without an "error" element (direct reading alone). */
     QM_NO_RESPONSE = -2,       /**< No HTTP response code arrived. */
     QM_UNUSABLE_RESPONSE = -3, /**< An HTTP response arrived, but no usable reply in it. */
     QM_SIGNATURE_FAILED = -4,  /**< The request signature could not be made; nothing was sent. */
-    QM_UNUSABLE_ERROR_NUMBER =
-        -8,                 /**< Refused with an error number that is missing, zero or no number. */
-    QM_MALFORMED_REPLY = -9 /**< The reply is not well-formed XML. */
+    QM_UNUSABLE_ERROR_NUMBER = -8, /**< Refused; the error number is missing, 0 or no number. */
+    QM_MALFORMED_REPLY = -9        /**< The reply is not well-formed XML. */
 } qm_status;
 
 /* -------------------------------------------------------------------------------------------------
@@ -71,10 +69,8 @@ typedef enum qm_status {
 typedef struct transfer_settings {
     char *path; /**< Certificate authority bundle (PEM file), malloc memory of the library's, or
                      NULL: then transfers run without verifying the peer's certificate. */
-    int64_t
-        default_timeout; /**< Seconds for a whole transfer that names no time-out; initially 30. */
-    int32_t connection_attempts; /**< How often one request is tried before it is given up;
-                                    initially 6. */
+    int64_t default_timeout;     /**< Seconds for a transfer that names none; initially 30. */
+    int32_t connection_attempts; /**< How often a request is tried; initially 6. */
 } transfer_settings;
 
 /** The proxy of every transfer. The texts are malloc memory of the library's. */
@@ -120,14 +116,14 @@ extern QM_API const char *api_version;
  */
 extern QM_API const char *urls[4];
 
-/** Called with every refusal by the service; initially check_api_error_empty. Must not be NULL. */
+/** Called with every refusal by the service; initially check_api_error_empty. NULL calls nothing.
+ */
 extern QM_API api_error_hook check_api_error;
 
 /** The proxy; initially all zero. See set_user_proxy(). */
 extern QM_API proxy_settings proxy_server;
 
-/** Non-zero turns off verification of the peer's certificate and host name in operations; initially
- * 0. */
+/** Non-zero: operations verify neither the certificate nor the host name; initially 0. */
 extern QM_API int32_t ssl_disabled;
 
 /** For test harnesses that keep a pointer here. The library never reads it. */
@@ -148,8 +144,8 @@ extern QM_API FILE *output_file;
  * Starts the library: libcurl, the locks of the TLS library, the shared DNS cache.
  *
  * @param ca_path certificate authority bundle (PEM file), copied; NULL leaves ca_cert_pem_path as
- * it is. The file is read by the transfers, not here. It replaces, and frees, a path stored
- * earlier.
+ *                it is. The file is read by the transfers, not here. It replaces, and frees, a path
+ *                stored earlier.
  *
  * Call it once, before any request and before other threads use libcurl or OpenSSL; again only
  * after api_global_cleanup(). Problems are logged and the library goes on without the part that
@@ -206,7 +202,8 @@ QM_API int32_t set_connection_attempts(int32_t attempts);
  * @param user     user name, or NULL
  * @param password password, or NULL
  *
- * A copy that the heap has no room for leaves its field NULL. Configuration.
+ * The earlier texts are freed first, so the arguments must not be among them. A copy that the heap
+ * has no room for leaves its field NULL. Configuration.
  */
 QM_API void set_user_proxy(const char *host, int64_t port, const char *user, const char *password);
 
@@ -267,7 +264,7 @@ QM_API int32_t tls_init(void);
  * Makes a libcurl share handle (CURLSH *) through which transfers share one DNS cache.
  *
  * @return the handle, the caller's to release with curl_share_cleanup(); NULL when it could not be
- * made, which is logged except when libcurl made no handle at all. Any thread.
+ *         made, which is logged except when libcurl made no handle at all. Any thread.
  */
 QM_API void *create_curl_share_init(void);
 
@@ -301,9 +298,8 @@ typedef struct string_buffer {
     uint64_t length;   /**< Bytes of text, its terminating NUL not counted. */
     uint64_t capacity; /**< Bytes allocated for the text. */
     char *bytes;       /**< The text and its NUL, or NULL as long as nothing was allocated. */
-    redaction_range
-        *redaction_ranges; /**< Ranges in the order in which they were added, or NULL. */
-    char *redacted_copy;   /**< What string_get_obfs() made last, or NULL. */
+    redaction_range *redaction_ranges; /**< In the order in which they were added, or NULL. */
+    char *redacted_copy;               /**< What string_get_obfs() made last, or NULL. */
 } string_buffer;
 
 /**
@@ -354,7 +350,7 @@ QM_API uint64_t string_get_size(const string_buffer *buffer);
  *
  * @param replacement the marker, or NULL for "(omitted)"
  * @return the buffer's own text if it has no ranges; otherwise a copy, borrowed until the next call
- * on this buffer or its end
+ *         on this buffer or its end
  */
 QM_API const char *string_get_obfs(string_buffer *buffer, const char *replacement);
 
@@ -370,7 +366,7 @@ QM_API int64_t string_reduce(string_buffer *buffer, uint64_t count);
  * Releases a buffer. NULL is ignored.
  *
  * @param free_text 1 frees the text too; any other value leaves it to the caller, who took it with
- * string_get() and frees it with free()
+ *                  string_get() and frees it with free()
  */
 QM_API void string_delete(string_buffer *buffer, int32_t free_text);
 
@@ -386,7 +382,7 @@ QM_API char *string_dup(const char *text);
  *
  * @param character only its low 8 bits count
  * @return 1 for an ASCII letter or digit and for ! ( ) * ^, else 0. Deliberately, "-", ".", "_" and
- * "~" are encoded, though RFC 3986 does not ask for it. Any thread.
+ *         "~" are encoded, though RFC 3986 does not ask for it. Any thread.
  */
 QM_API int32_t url_acceptable_letter(int32_t character);
 
@@ -432,13 +428,13 @@ QM_API int32_t simple_sha1(const void *data, uint64_t length, char *output,
  * @param url             the whole URL, at least 27 bytes long
  * @param body            bytes to POST, or NULL
  * @param body_length     their number, or 0; the request is a GET unless both body and body_length
- * are given
+ *                        are given
  * @param response        receives the body of the response with a NUL behind it, or NULL if it was
- * empty or no transfer succeeded; the caller frees it
+ *                        empty or no transfer succeeded; the caller frees it
  * @param response_length receives its length in bytes
  * @param timeout_seconds for each attempt; below 1 means ca_cert_pem_path.default_timeout
  * @return the HTTP status code (RFC 9110) whatever it says, 0 for a scheme that has none, or -1 if
- * the URL is too short or every attempt failed. Each failed transfer is logged.
+ *         the URL is too short or every attempt failed. Each failed transfer is logged.
  *
  * Up to 30 redirects are followed, to HTTP and HTTPS alone, and never from HTTPS back to HTTP.
  * Blocks. Any thread, between api_global_init() and api_global_cleanup().
@@ -471,7 +467,7 @@ QM_API int32_t check_url_response_code(const char *url, int32_t timeout_millisec
  * @param expected_body        the body that must arrive
  * @param timeout_milliseconds rounded away from zero to whole seconds; 0 for none
  * @return 1 if the status code is 200 and the body equals the expected one, else 0, which is
- * logged. Blocks. Any thread.
+ *         logged. Blocks. Any thread.
  */
 QM_API int32_t check_url_response(const char *base_url, const char *query,
                                   const char *expected_body, int32_t timeout_milliseconds);
@@ -482,7 +478,7 @@ QM_API int32_t check_url_response(const char *base_url, const char *query,
  * @param url    the link, or NULL
  * @param scheme the bare name, such as "https", or NULL
  * @return the scheme, ":" and the link, if the link's first "//" has no ":" before it and a byte
- * behind it; otherwise a copy of the link; NULL for NULL. The caller frees it. Any thread.
+ *         behind it; otherwise a copy of the link; NULL for NULL. The caller frees it. Any thread.
  */
 QM_API char *normalize_url(const char *url, const char *scheme);
 
@@ -577,10 +573,10 @@ typedef struct node_value_state {
  * @param xml          the document, UTF-8
  * @param length       its length in bytes; only the low 32 bits count
  * @param sought       an element's name, which matches at any depth, or a path such as
- * "/folder_info/name", which leaves out the root
+ *                     "/folder_info/name", which leaves out the root
  * @param parse_failed receives 1 if the document is not well-formed, which is logged, else 0
  * @return the text, the caller's to free; NULL if nothing matched, the matches hold no text, or xml
- * is NULL or length 0
+ *         is NULL or length 0
  *
  * The text of several matches is joined. Deliberately, an element's text ends at the next end tag
  * of any element, so what follows a child element is left out. After a parse failure the text
@@ -613,9 +609,9 @@ QM_API void node_value_data_accumulate(char **value, const char *text, int32_t l
  * @param xml           the reply
  * @param length        its length in bytes
  * @param error_code    receives the service's number, QM_UNUSABLE_ERROR_NUMBER, or
- * QM_MALFORMED_REPLY; may be NULL
+ *                      QM_MALFORMED_REPLY; may be NULL
  * @param error_message receives the message or NULL, and after a parse failure a text that says so;
- * the caller frees it; may be NULL
+ *                      the caller frees it; may be NULL
  *
  * Any thread.
  */
@@ -710,11 +706,13 @@ QM_API void api_request_delete(api_request **request);
  * The results of operations. For each kind of record there is
  *
  *   <record>_new          makes a record with copies of its own of the texts, any of which may be
- * NULL; <record>_get_<field>  returns a field: the text of one element of the reply exactly as it
- * was sent, numbers, dates and yes/no answers included, or NULL when the reply lacked it. The text
- * belongs to the record. NULL (0 for a number) if the record is NULL; <record>_delete       frees
- * *record and its texts, and deliberately leaves the pointer as it was. NULL, or a pointer to NULL,
- * does nothing.
+ *                         NULL;
+ *   <record>_get_<field>  returns a field: the text of one element of the reply exactly as it was
+ *                         sent, numbers, dates and yes/no answers included, or NULL when the reply
+ *                         lacked it. The text belongs to the record. NULL (0 for a number) if the
+ *                         record is NULL;
+ *   <record>_delete       frees *record and its texts, and deliberately leaves the pointer as it
+ *                         was. NULL, or a pointer to NULL, does nothing.
  *
  * A record may be read on several threads at once.
  * ---------------------------------------------------------------------------------------------- */
@@ -963,7 +961,7 @@ QM_API void file_links_delete(file_links **record);
  *   <kind>_list_new        makes an empty list;
  *   add_to_<kind>_list     hands a record over to a list; does nothing if either is NULL;
  *   delete_all_<kind>_list deletes *list with all its records, and deliberately leaves the pointer
- * as it was. NULL, or a pointer to NULL, does nothing.
+ *                          as it was. NULL, or a pointer to NULL, does nothing.
  * ---------------------------------------------------------------------------------------------- */
 
 /** A node of a list of files. */
@@ -972,6 +970,7 @@ typedef struct file_list {
     struct file_list *next; /**< NULL at the end. */
 } file_list;
 
+/** Makes such a list, hands a record over to it, deletes it with its records; see above. */
 QM_API file_list *file_info_list_new(void);
 QM_API void add_to_file_list(file_list *list, file_info *record);
 QM_API void delete_all_file_list(file_list **list);
@@ -982,6 +981,7 @@ typedef struct folder_list {
     struct folder_list *next; /**< NULL at the end. */
 } folder_list;
 
+/** Makes such a list, hands a record over to it, deletes it with its records; see above. */
 QM_API folder_list *folder_info_list_new(void);
 QM_API void add_to_folder_list(folder_list *list, folder_info *record);
 QM_API void delete_all_folder_list(folder_list **list);
@@ -992,6 +992,7 @@ typedef struct change_list {
     struct change_list *next; /**< NULL at the end. */
 } change_list;
 
+/** Makes such a list, hands a record over to it, deletes it with its records; see above. */
 QM_API change_list *change_list_new(void);
 QM_API void add_to_change_list(change_list *list, change_info *record);
 QM_API void delete_all_change_list(change_list **list);
@@ -1002,6 +1003,7 @@ typedef struct file_links_list {
     struct file_links_list *next; /**< NULL at the end. */
 } file_links_list;
 
+/** Makes such a list, hands a record over to it, deletes it with its records; see above. */
 QM_API file_links_list *file_links_list_new(void);
 QM_API void add_to_file_links_list(file_links_list *list, file_links *record);
 QM_API void delete_all_file_links_list(file_links_list **list);
@@ -1040,9 +1042,10 @@ QM_API void key_value_delete(key_value *list);
  *
  * Each takes a reply and its length, of which only the low 32 bits count, and lists of the
  * caller's, and makes one record for each entry, in the reply's order. An entry's texts are those
- * of the elements right inside it; an element that occurs twice has its texts joined. They return 1
- * if the reply is not well-formed, else 0; the records finished before the damage stay in the lists
- * and are counted. A reply that is NULL or of length 0 returns 0 and touches nothing. Any thread.
+ * of the elements inside it, at any depth; an element that occurs twice has its texts joined. They
+ * return 1 if the reply is not well-formed, else 0; the records finished before the damage stay in
+ * the lists and are counted. A reply that is NULL or of length 0 returns 0 and touches nothing. Any
+ * thread.
  *
  * The callbacks below are expat's, for a start tag, an end tag and text, and take the state of
  * their extractor.
@@ -1116,17 +1119,17 @@ QM_API void simple_extract_links_node_value_data(void *state, const char *text, 
  * between api_global_init() and api_global_cleanup(). What they have in common:
  *
  *   - The path of the request stands in an exported variable, the operation's name with _uri, which
- * is read at every call and may be changed. The library never frees it.
+ *     is read at every call and may be changed. The library never frees it.
  *   - A session token is sent as it is; other texts are percent-encoded where the operation does
- * not say otherwise.
+ *     not say otherwise.
  *   - error_message receives the message of a failure or NULL, and is the caller's to free.
- * QM_NO_RESPONSE and QM_UNUSABLE_RESPONSE come with a message of the library's, service errors with
- * the service's own.
+ *     QM_NO_RESPONSE and QM_UNUSABLE_RESPONSE come with a message of the library's, service errors
+ *     with the service's own.
  *   - The status is QM_OK; the service's own error number (positive); QM_NO_RESPONSE;
- * QM_UNUSABLE_RESPONSE; QM_UNUSABLE_ERROR_NUMBER; or QM_MALFORMED_REPLY, which overrides the
- * others. Records are handed out only with QM_OK.
+ *     QM_UNUSABLE_RESPONSE; QM_UNUSABLE_ERROR_NUMBER; or QM_MALFORMED_REPLY, which overrides the
+ *     others. Records are handed out only with QM_OK.
  *   - URLs (session tokens included) and replies are written to the diagnostic log. Only passwords,
- * Facebook access tokens and signatures are left out of it.
+ *     Facebook access tokens and signatures are left out of it.
  * ---------------------------------------------------------------------------------------------- */
 
 /**
@@ -1144,12 +1147,12 @@ extern QM_API const char *renew_session_token_uri; /**< "/api/user/renew_session
  * @param email                 e-mail address, or NULL or ""
  * @param password              password, or NULL or ""
  * @param fb_access_token       Facebook access token, or NULL or ""; used unless both email and
- * password are given
+ *                              password are given
  * @param application_id        id of the application
  * @param application_key       key of the application, never sent nor logged
  * @param session_token_or_error receives the session token, or the error message
  * @return a status; QM_UNUSABLE_RESPONSE also for a "Success" without a token, and
- * QM_SIGNATURE_FAILED
+ *         QM_SIGNATURE_FAILED
  *
  * With QM_MALFORMED_REPLY a token that stood in the reply before the damage is handed out all the
  * same.
@@ -1166,12 +1169,13 @@ QM_API int32_t get_session_token(const char *email, const char *password,
  * @param application_id       id of the application
  * @param application_key      key of the application, never sent nor logged
  * @param pkey                 receives the reply's "pkey" or NULL, also when the login is refused;
- * the caller frees it. Left as it was when no reply arrives. Must point to a slot from malloc():
- * with QM_MALFORMED_REPLY, deliberately, the slot itself is freed (and what it held is not)
+ *                             the caller frees it. Left as it was when no reply arrives. Must point
+ *                             to a slot from malloc(): with QM_MALFORMED_REPLY, deliberately, the
+ *                             slot itself is freed (and what it held is not)
  * @param login_token_or_error receives the login token, or the error message; transport failures
- * have none
+ *                             have none
  * @return a status; a negative response code counts as QM_UNUSABLE_RESPONSE here, as does a
- * "Success" without a token; QM_SIGNATURE_FAILED
+ *         "Success" without a token; QM_SIGNATURE_FAILED
  */
 QM_API int32_t get_login_token(const char *email, const char *password, const char *application_id,
                                const char *application_key, char **pkey,
@@ -1182,7 +1186,7 @@ QM_API int32_t get_login_token(const char *email, const char *password, const ch
  *
  * @param session_token          the current token
  * @param session_token_or_error receives the new token, or the error message; transport failures
- * have none
+ *                               have none
  * @return a status; QM_UNUSABLE_RESPONSE also for a "Success" without a token
  *
  * Deliberately, the URL is not logged.
@@ -1251,7 +1255,7 @@ QM_API int32_t get_user_limits(const char *session_token, user_limits **limits,
  * @param revision      receives the revision as text, or NULL; the caller frees it
  * @param epoch         receives the epoch as text, or NULL; the caller frees it
  * @return a status; QM_OK needs only one of the two, and QM_UNUSABLE_RESPONSE means that neither
- * came. A negative response code counts as QM_UNUSABLE_RESPONSE here
+ *         came. A negative response code counts as QM_UNUSABLE_RESPONSE here
  *
  * Deliberately, nothing is logged, and transport failures have no message.
  */
@@ -1292,7 +1296,7 @@ QM_API int32_t get_folder_info(const char *session_token, const char *folder_key
  * @param parent_key    folder to create it in; NULL or "" for the account's root
  * @param mtime         modification time; NULL or "" for none
  * @param folder_key    receives the new folder's key, or NULL if the call failed or the reply named
- * none; the caller frees it
+ *                      none; the caller frees it
  */
 QM_API int32_t create_folder(const char *session_token, const char *name, const char *parent_key,
                              const char *mtime, char **folder_key, char **error_message);
@@ -1323,9 +1327,9 @@ QM_API int32_t update_folder(const char *session_token, const char *folder_key, 
  * @param session_token   the session
  * @param source_key      the folder to copy, sent as it is
  * @param destination_key the receiving folder, sent as it is, or NULL to leave it out of the
- * request
+ *                        request
  * @param new_folder_key  receives the key of the copy, or NULL if the call failed or the reply
- * named none; the caller frees it
+ *                        named none; the caller frees it
  * @return a status, QM_NO_ERROR_ELEMENT among them
  */
 QM_API int32_t copy_folder(const char *session_token, const char *source_key,
@@ -1338,7 +1342,7 @@ QM_API int32_t copy_folder(const char *session_token, const char *source_key,
  * @param session_token   the session
  * @param source_key      the folder to move, sent as it is
  * @param destination_key the receiving folder, sent as it is, or NULL to leave it out of the
- * request
+ *                        request
  * @return a status, QM_NO_ERROR_ELEMENT among them
  */
 QM_API int32_t move_folder(const char *session_token, const char *source_key,
@@ -1346,8 +1350,7 @@ QM_API int32_t move_folder(const char *session_token, const char *source_key,
 
 /**
  * Reads one chunk of a folder's listing. All texts are sent as they are; each may be NULL, which
- * leaves it out, while
- * "" is sent.
+ * leaves it out, while "" is sent.
  *
  * @param session_token the session
  * @param folder_key    the folder
@@ -1356,14 +1359,14 @@ QM_API int32_t move_folder(const char *session_token, const char *source_key,
  * @param content_type  the kind of entries asked for
  * @param error_message deliberately ahead of the results
  * @param folders       receives the chunk's folders, or NULL if there are none; the caller deletes
- * the list
+ *                      the list
  * @param folder_count  receives their number
  * @param files         receives the chunk's files, or NULL if there are none; the caller deletes
- * the list
+ *                      the list
  * @param file_count    receives their number
  * @param chunk_size    receives the most entries that a chunk holds, 100 if the reply does not say
  * @return a status, QM_NO_ERROR_ELEMENT among them. With QM_MALFORMED_REPLY both lists are NULL,
- * but the numbers may have been set
+ *         but the numbers may have been set
  */
 QM_API int32_t get_folder_content(const char *session_token, const char *folder_key,
                                   const char *device_id, const char *chunk,
@@ -1411,7 +1414,7 @@ QM_API int32_t get_file_info(const char *quick_key, const char *session_token, c
  * @param parent_key     folder to create it in, or NULL
  * @param mtime          modification time; NULL or "" for none
  * @param quick_key      receives the new file's key, or NULL if the call failed or the reply named
- * none; the caller frees it
+ *                       none; the caller frees it
  */
 QM_API int32_t create_file(const char *session_token, const char *filename,
                            const char *file_extension, const char *parent_key, const char *mtime,
@@ -1427,7 +1430,7 @@ QM_API int32_t delete_file(const char *session_token, const char *quick_key, cha
  * @param quick_key     the file, sent as it is
  * @param folder_key    the receiving folder, or NULL to leave it out of the request
  * @param new_quick_key receives the key of the copy, or NULL if the call failed or the reply named
- * none; the caller frees it
+ *                      none; the caller frees it
  */
 QM_API int32_t copy_file(const char *session_token, const char *quick_key, const char *folder_key,
                          char **new_quick_key, char **error_message);
@@ -1464,13 +1467,13 @@ QM_API int32_t get_links(const char *quick_key, const char *link_type, const cha
  * @param session_token          the session
  * @param quick_key              the file, sent as it is
  * @param download_url           receives the link, or NULL if there is none; a link without a
- * scheme is given "http". The caller frees it
+ *                               scheme is given "http". The caller frees it
  * @param free_bandwidth         receives the bandwidth that is left for free downloads, or 0
  * @param error_message          deliberately between the two pairs of results
  * @param download_error         receives the number of a refusal of the download, or 0
  * @param download_error_message receives that refusal's message or NULL; the caller frees it
  * @return a status; QM_OK says nothing of the link: see download_url and download_error. With
- * QM_MALFORMED_REPLY the two texts are NULL, but the numbers may have been set
+ *         QM_MALFORMED_REPLY the two texts are NULL, but the numbers may have been set
  */
 QM_API int32_t get_download_link(const char *session_token, const char *quick_key,
                                  char **download_url, int32_t *free_bandwidth, char **error_message,
@@ -1487,11 +1490,11 @@ extern QM_API const char *get_device_changes_uri; /**< "/api/device/get_changes.
  * @param device_id       id of the device
  * @param device_revision receives the account's revision now, or 0
  * @param changes         receives the list of changes, which may be empty, or NULL; the caller
- * deletes it. With QM_MALFORMED_REPLY, deliberately, it may point to a list that has been deleted
- * already: do not touch it
+ *                        deletes it. With QM_MALFORMED_REPLY, deliberately, it may point to a list
+ *                        that has been deleted already: do not touch it
  * @param change_count    receives the number of changes
  * @param block_size      receives the number of revisions of which the service hands out changes at
- * once, or 0
+ *                        once, or 0
  *
  * With QM_MALFORMED_REPLY the numbers may have been set.
  */

@@ -2,10 +2,12 @@
 
 #include <cstdlib>
 #include <cstring>
+#include <memory>
 
 #include <curl/curl.h>
 #include <openssl/crypto.h>
 
+#include "owned.h"
 #include "quillmere.h"
 #include "runtime/memory.h"
 
@@ -24,25 +26,31 @@ struct superseded_mutexes {
 };
 superseded_mutexes *superseded = nullptr;
 
-void keep_superseded()
+// False if there is no memory to remember the present array by.
+bool keep_superseded()
 {
     if (!tls_mutexes)
-        return;
-    auto *kept = allocate_zeroed<superseded_mutexes>();
+        return true;
+    auto *kept =
+        static_cast<superseded_mutexes *>(try_allocate_zeroed(1, sizeof(superseded_mutexes)));
+    if (!kept)
+        return false;
     *kept = {tls_mutexes, superseded};
     superseded = kept;
+    return true;
 }
+
+using mutex_array = std::unique_ptr<pthread_mutex_t, releaser<free_memory>>;
 
 bool make_tls_mutexes()
 {
-    auto *mutexes = static_cast<pthread_mutex_t *>(
-        try_allocate_zeroed(static_cast<uint64_t>(CRYPTO_num_locks()), sizeof(pthread_mutex_t)));
-    if (!mutexes)
+    mutex_array mutexes(static_cast<pthread_mutex_t *>(
+        try_allocate_zeroed(static_cast<uint64_t>(CRYPTO_num_locks()), sizeof(pthread_mutex_t))));
+    if (!mutexes || !keep_superseded())
         return false;
+    tls_mutexes = mutexes.release();
     for (int index = 0; index < CRYPTO_num_locks(); ++index)
-        pthread_mutex_init(&mutexes[index], nullptr);
-    keep_superseded();
-    tls_mutexes = mutexes;
+        pthread_mutex_init(&tls_mutexes[index], nullptr);
     return true;
 }
 

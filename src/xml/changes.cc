@@ -14,23 +14,30 @@ constexpr int32_t updated = 1;
 constexpr int32_t in_files = 0;
 constexpr int32_t in_folders = 1;
 
-constexpr element_field<change_info> file_elements[] = {
+// Both kinds have their key in the same row: a record whose section changes under way goes on with
+// the texts that it has.
+constexpr element_field<change_info> change_elements[] = {
     {"quickkey", &change_info::key},      {"parent_folderkey", &change_info::parent_folderkey},
     {"created", &change_info::created},   {"filename", &change_info::filename},
     {"mimetype", &change_info::mimetype}, {"filetype", &change_info::filetype},
 };
 
-constexpr element_field<change_info> folder_elements[] = {
-    {"folderkey", &change_info::key},
-    {"parent_folderkey", &change_info::parent_folderkey},
-};
-
 // The public state comes first, so that the exported callbacks can take the whole for it.
 struct extraction {
     changes_state state;
-    field_joiner<change_info, std::size(file_elements)> file_texts{file_elements};
-    field_joiner<change_info, std::size(folder_elements)> folder_texts{folder_elements};
+    field_joiner<change_info, std::size(change_elements)> texts{change_elements};
 };
+
+// The table's name for the element whose text comes next. A folder's key has a name of its own, and
+// of the rest a folder has nothing but the parent; for anything else the result is null.
+const char *text_element(const changes_state &state)
+{
+    if (state.object_kind != in_folders)
+        return state.current_element;
+    if (is(state.current_element, "folderkey"))
+        return "quickkey";
+    return is(state.current_element, "parent_folderkey") ? state.current_element : nullptr;
+}
 
 uint64_t number_in(const char *text, int length)
 {
@@ -39,9 +46,8 @@ uint64_t number_in(const char *text, int length)
     return uint64_in(string_get(copy.get()));
 }
 
-template <class FileJoiner, class FolderJoiner>
-void add_text(changes_state &state, FileJoiner &&files, FolderJoiner &&folders, const char *text,
-              int length)
+template <class Joiner>
+void add_text(changes_state &state, Joiner &&texts, const char *text, int length)
 {
     if (!state.in_object || !state.current_element)
         return;
@@ -49,19 +55,19 @@ void add_text(changes_state &state, FileJoiner &&files, FolderJoiner &&folders, 
     // The last piece of a revision decides, deliberately: unlike texts, pieces are not joined.
     if (is(state.current_element, "revision"))
         change.revision = number_in(text, length);
+    const char *element = text_element(state);
+    if (!element)
+        return;
     // The kind of key tells a file from a folder, and each is only looked for in its own section.
-    if (is(state.current_element, state.object_kind == in_folders ? "folderkey" : "quickkey"))
+    if (is(element, "quickkey"))
         change.is_folder = state.object_kind;
-    if (state.object_kind == in_folders)
-        folders.append(change, state.current_element, text, length);
-    else
-        files.append(change, state.current_element, text, length);
+    texts.append(change, element, text, length);
 }
 
 void extract_text(void *user_data, const char *text, int length)
 {
     auto *running = static_cast<extraction *>(user_data);
-    add_text(running->state, running->file_texts, running->folder_texts, text, length);
+    add_text(running->state, running->texts, text, length);
 }
 
 bool starts_record(const char *element) { return is(element, "file") || is(element, "folder"); }
@@ -157,6 +163,5 @@ void simple_extract_changes_node_value_end(void *state, const char *element)
 
 void simple_extract_changes_node_value_data(void *state, const char *text, int32_t length)
 {
-    add_text(*static_cast<changes_state *>(state), measuring_joiner(file_elements),
-             measuring_joiner(folder_elements), text, length);
+    add_text(*static_cast<changes_state *>(state), measuring_joiner(change_elements), text, length);
 }

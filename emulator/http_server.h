@@ -1,0 +1,55 @@
+// HTTP and HTTPS on the loopback interface, with every limit in its own hands.
+#pragma once
+
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <functional>
+#include <memory>
+
+#include <boost/asio/io_context.hpp>
+#include <boost/asio/ssl/context.hpp>
+
+#include "service.h"
+
+namespace emulator {
+
+struct server_limits {
+    std::uint32_t header_bytes = 64 * 1024; // the target with its query included
+    std::uint64_t body_bytes = 1024 * 1024;
+    std::size_t connections = 256;          // further ones wait in the kernel's queue
+    std::chrono::seconds exchange_time{30}; // for a handshake, a request, a reply
+    std::chrono::seconds idle_time{60};     // between two requests of one connection
+};
+
+using request_handler = std::function<reply(const request &)>;
+
+/** Serves on one thread, the one that runs the context: the handler is never run twice at once. */
+class http_server {
+public:
+    http_server(boost::asio::io_context &context, const server_limits &limits,
+                request_handler handler);
+    ~http_server();
+
+    /**
+     * Listens on 127.0.0.1 and, where the machine has it, on ::1, on one and the same port.
+     *
+     * @param port 0 lets the kernel pick one
+     * @param tls  the certificate to serve HTTPS with, or null for HTTP; must outlive the server
+     * @return the port
+     */
+    std::uint16_t listen(std::uint16_t port, boost::asio::ssl::context *tls);
+
+    /**
+     * Accepts nothing more, ends idle connections, and lets each reply under way be finished.
+     *
+     * @param finished called, unless the server is gone by then, when no connection is left
+     */
+    void stop(std::function<void()> finished);
+
+private:
+    class state;
+    std::shared_ptr<state> state_;
+};
+
+} // namespace emulator

@@ -1,0 +1,19 @@
+// Which bytes may stand in a reply, and numbers as they are written in requests.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string_view>
+
+namespace emulator {
+
+/**
+ * Whether the text is well-formed UTF-8 of characters that XML 1.0 can carry. Everything that the
+ * service stores or echoes has passed this, so that a reply can always be written.
+ */
+bool is_xml_text(std::string_view text);
+
+/** The value of a decimal number without sign or blanks, or nothing if it is none or too large. */
+std::optional<std::uint64_t> parse_decimal(std::string_view text, std::uint64_t largest);
+
+} // namespace emulator

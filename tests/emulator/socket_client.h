@@ -1,0 +1,45 @@
+// The plainest of clients: sends bytes and reads bytes, so that a test sees exactly what went over
+// the wire.
+#pragma once
+
+#include <cstdint>
+#include <filesystem>
+#include <memory>
+#include <string>
+
+#include "files.h"
+
+class socket_client {
+public:
+    /** Connects to 127.0.0.1, or to ::1. Throws when refused. */
+    explicit socket_client(std::uint16_t port, bool ipv6 = false);
+
+    void send(const std::string &bytes);
+    /** Sends no more; the server sees the end. */
+    void finish();
+    /** Reads until the text has arrived or the connection is over; returns what came so far. */
+    std::string read_until(const std::string &text);
+    /** Reads one reply with its body, whose length its header must state. */
+    std::string read_reply();
+    /** Reads until the server closes. */
+    std::string read_to_end();
+
+private:
+    bool read_piece();
+
+    emulator::descriptor socket_;
+    std::string received_;
+};
+
+/** One GET over HTTP on a connection of its own; the whole reply. */
+std::string get(std::uint16_t port, const std::string &target);
+
+/**
+ * One GET over HTTPS with the peer verified against the root and the name. Throws when the
+ * certificate does not hold.
+ */
+std::string get_verified(std::uint16_t port, const std::string &target,
+                         const std::filesystem::path &root, const std::string &name);
+
+/** The text of the first element of this name, or an empty text. */
+std::string element(const std::string &reply, const std::string &name);

@@ -1,0 +1,164 @@
+// What the command line does with its words, its files and its standard streams.
+#include <filesystem>
+#include <string>
+
+#include <sys/stat.h>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
+
+#include "program.h"
+#include "support/certificates.h"
+#include "support/scripted_server.h"
+
+namespace quillmere_test {
+namespace {
+
+using testing::AllOf;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::StartsWith;
+
+class Usage : public testing::Test {
+protected:
+    program_home home;
+};
+
+TEST_F(Usage, IsExplainedOnRequest)
+{
+    const outcome ended = home.run({"--help"});
+
+    EXPECT_EQ(ended.exit_status, 0);
+    for (const char *command : {"login", "logout", "status", "limits", "device-status"})
+        EXPECT_THAT(ended.out, HasSubstr(command));
+    EXPECT_THAT(ended.err, IsEmpty());
+}
+
+TEST_F(Usage, OfACommandIsExplainedToo)
+{
+    const outcome ended = home.run({"login", "--help"});
+
+    EXPECT_EQ(ended.exit_status, 0);
+    EXPECT_THAT(ended.out, HasSubstr("--password-stdin"));
+}
+
+TEST_F(Usage, HasAVersion)
+{
+    const outcome ended = home.run({"--version"});
+
+    EXPECT_EQ(ended.exit_status, 0);
+    EXPECT_EQ(ended.out, "quillmere " QUILLMERE_VERSION "\n");
+}
+
+TEST_F(Usage, IsWrongWithoutACommandOrWithAnUnknownOne)
+{
+    using words = std::vector<std::string>;
+    for (const words &arguments :
+         {words{}, words{"frobnicate"}, words{"limits", "--frobnicate"}, words{"limits", "extra"},
+          words{"limits", "--timeout", "0"}, words{"limits", "--timeout", "soon"},
+          words{"device-status", "--device-id", "4294967296"},
+          words{"device-status", "--device-id", "-1"}, words{"limits", "--service", "http://h"},
+          words{"limits", "--service", "https://h", "--emulator", "f"},
+          words{"login", "a", "--password-stdin", "--password-file", "f"}}) {
+        const outcome ended = home.run(arguments);
+        EXPECT_EQ(ended.exit_status, 2) << testing::PrintToString(arguments);
+        EXPECT_THAT(ended.err, StartsWith("quillmere: ")) << testing::PrintToString(arguments);
+        EXPECT_THAT(ended.out, IsEmpty());
+    }
+}
+
+TEST_F(Usage, IsWrongInJsonToo)
+{
+    const outcome ended = home.run({"frobnicate", "--json"});
+
+    EXPECT_EQ(ended.exit_status, 2);
+    EXPECT_EQ(nlohmann::json::parse(ended.out).at("error").at("kind"), "usage");
+    EXPECT_THAT(ended.err, IsEmpty());
+}
+
+TEST_F(Usage, NeedsAnApplicationToSignIn)
+{
+    EXPECT_EQ(home.run({"login", "a@b", "--password-stdin"}, "p").exit_status, 2);
+    EXPECT_EQ(home.run({"login", "a@b", "--password-stdin", "--app-id", "1"}, "p").exit_status, 2);
+}
+
+TEST_F(Usage, OfAnEmptyPasswordIsRefused)
+{
+    home.environment["QUILLMERE_APP_ID"] = "1";
+    home.environment["QUILLMERE_APP_KEY"] = "k";
+
+    EXPECT_EQ(home.run({"login", "a@b", "--password-stdin"}, "\n").exit_status, 9);
+}
+
+TEST_F(Usage, OfSigningOutNeedsNoService)
+{
+    home.sign_in("https://h", "token");
+
+    const outcome first = home.run({"logout"});
+    const outcome second = home.run({"logout", "--json"});
+
+    EXPECT_EQ(first.exit_status, 0);
+    EXPECT_EQ(first.out, "Signed out\n");
+    EXPECT_FALSE(std::filesystem::exists(home.session_path()));
+    EXPECT_EQ(second.exit_status, 0);
+    EXPECT_EQ(nlohmann::json::parse(second.out).at("signed_out"), false);
+}
+
+TEST_F(Usage, OfADamagedSessionFileIsToldOnlyWhereItMatters)
+{
+    home.sign_in("https://h", "token");
+    home.folder().write("state/quillmere/session.json", "{");
+
+    EXPECT_EQ(home.run({"device-status"}).exit_status, 9);
+    EXPECT_EQ(home.run({"logout"}).exit_status, 0);
+}
+
+TEST_F(Usage, OfAProfileReplacesOptions)
+{
+    scripted_server server(tls_with(loopback_certificate()));
+    server.answer(xml_reply("<response><result>Success</result></response>"));
+    home.configure("[work]\nservice = " + server.base_url() + "\nca_file = " + test_root_path() +
+                   "\n");
+
+    EXPECT_EQ(home.run({"limits", "--profile", "work"}).exit_status, 0);
+    home.environment["QUILLMERE_PROFILE"] = "work";
+    EXPECT_EQ(home.run({"limits"}).exit_status, 0);
+    EXPECT_EQ(home.run({"limits", "--profile", "play"}).exit_status, 9);
+    EXPECT_EQ(server.connections(), 2U);
+}
+
+TEST_F(Usage, OfALogFileKeepsItPrivate)
+{
+    const std::string log = home.folder().write("log", "before\n");
+    ASSERT_EQ(::chmod(log.c_str(), 0644), 0);
+
+    home.run({"logout", "--log-file", log});
+
+    struct stat facts = {};
+    ASSERT_EQ(::stat(log.c_str(), &facts), 0);
+    EXPECT_EQ(facts.st_mode & 0777U, 0600U);
+    EXPECT_THAT(content_of(log), StartsWith("before\n"));
+}
+
+TEST_F(Usage, OfALogFileThatCannotBeOpenedFails)
+{
+    EXPECT_EQ(home.run({"logout", "--log-file", home.folder().path()}).exit_status, 9);
+}
+
+TEST_F(Usage, OfAStandardOutputThatTakesNothingFails)
+{
+    command full;
+    full.program = "sh";
+    full.arguments = {"-c", "\"$0\" --version >/dev/full; echo $?; \"$0\" --version >&-; echo $?",
+                      QUILLMERE_PROGRAM};
+
+    const outcome ended = run(full);
+
+    EXPECT_EQ(ended.out, "9\n9\n");
+    EXPECT_THAT(ended.err, AllOf(HasSubstr("cannot write to standard output"),
+                                 HasSubstr("No space left on device")));
+}
+
+} // namespace
+} // namespace quillmere_test

@@ -1,0 +1,124 @@
+#include "transport/easy_calls.h"
+
+#include <algorithm>
+#include <cstdarg>
+#include <cstring>
+#include <stdexcept>
+
+#undef curl_easy_setopt // a macro in some headers
+
+namespace quillmere_test {
+namespace {
+
+easy_calls *current = nullptr;
+
+bool is_text(CURLoption option)
+{
+    const CURLoption texts[] = {CURLOPT_URL,           CURLOPT_CAINFO,
+                                CURLOPT_PROXY,         CURLOPT_PROXYUSERNAME,
+                                CURLOPT_PROXYPASSWORD, CURLOPT_REDIR_PROTOCOLS_STR};
+    return std::find(std::begin(texts), std::end(texts), option) != std::end(texts);
+}
+
+void note(CURLoption option, void *value)
+{
+    easy_option noted = {option, 0, "", nullptr};
+    if (option < CURLOPTTYPE_OBJECTPOINT)
+        noted.number = reinterpret_cast<intptr_t>(value);
+    else if (is_text(option) && value)
+        noted.text = static_cast<const char *>(value);
+    else
+        noted.pointer = value;
+    current->options.push_back(noted);
+    if (option == CURLOPT_ERRORBUFFER) {
+        current->error_buffer = static_cast<char *>(value);
+        current->error_buffer_texts.push_back(current->error_buffer);
+    }
+}
+
+} // namespace
+
+easy_calls::easy_calls() { current = this; }
+easy_calls::~easy_calls() { current = nullptr; }
+
+std::vector<CURLoption> easy_calls::names(const std::vector<CURLoption> &without) const
+{
+    std::vector<CURLoption> result;
+    for (const easy_option &each : options)
+        if (std::find(without.begin(), without.end(), each.option) == without.end())
+            result.push_back(each.option);
+    return result;
+}
+
+bool easy_calls::has(CURLoption option) const
+{
+    std::vector<CURLoption> all = names();
+    return std::find(all.begin(), all.end(), option) != all.end();
+}
+
+const easy_option &easy_calls::last(CURLoption option) const
+{
+    for (auto each = options.rbegin(); each != options.rend(); ++each)
+        if (each->option == option)
+            return *each;
+    throw std::runtime_error("option " + std::to_string(option) + " was not set");
+}
+
+} // namespace quillmere_test
+
+using namespace quillmere_test;
+
+// The linker gives the library's calls to the __wrap_ names and libcurl's functions the __real_
+// names.
+extern "C" {
+
+CURL *real_init() __asm__("__real_curl_easy_init");
+CURLcode real_setopt(CURL *handle, CURLoption option, ...) __asm__("__real_curl_easy_setopt");
+CURLcode real_perform(CURL *handle) __asm__("__real_curl_easy_perform");
+void real_cleanup(CURL *handle) __asm__("__real_curl_easy_cleanup");
+
+CURL *watched_init() __asm__("__wrap_curl_easy_init");
+CURLcode watched_setopt(CURL *handle, int number, ...) __asm__("__wrap_curl_easy_setopt");
+CURLcode watched_perform(CURL *handle) __asm__("__wrap_curl_easy_perform");
+void watched_cleanup(CURL *handle) __asm__("__wrap_curl_easy_cleanup");
+
+CURL *watched_init()
+{
+    if (current && ++current->inits <= current->failing_inits)
+        return nullptr;
+    return real_init();
+}
+
+// Every value that the library passes is as wide as a pointer. The option is taken as an int, as it
+// is passed, because va_start must not be given an enumeration, whose width is the compiler's
+// choice.
+CURLcode watched_setopt(CURL *handle, int number, ...)
+{
+    va_list arguments;
+    va_start(arguments, number);
+    void *value = va_arg(arguments, void *);
+    va_end(arguments);
+    auto option = static_cast<CURLoption>(number);
+    if (current && current->refused == option)
+        return CURLE_BAD_FUNCTION_ARGUMENT;
+    if (current)
+        note(option, value);
+    return real_setopt(handle, option, value);
+}
+
+CURLcode watched_perform(CURL *handle)
+{
+    if (!current)
+        return real_perform(handle);
+    ++current->performances;
+    return current->perform ? current->perform(current->performances) : real_perform(handle);
+}
+
+void watched_cleanup(CURL *handle)
+{
+    if (current)
+        ++current->cleanups;
+    real_cleanup(handle);
+}
+
+} // extern "C"

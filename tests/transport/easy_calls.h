@@ -1,0 +1,46 @@
+// Stands between the library and libcurl's easy interface: shows a test every option that is set,
+// and fails when a test says so.
+#pragma once
+
+#include <functional>
+#include <string>
+#include <vector>
+
+#include <curl/curl.h>
+
+namespace quillmere_test {
+
+// Numbers stand in number; texts, copied, in text; other pointers in pointer.
+struct easy_option {
+    CURLoption option;
+    long number;
+    std::string text;
+    const void *pointer;
+};
+
+// While it lives, calls to libcurl go by its fields. One at a time, on one thread.
+class easy_calls {
+public:
+    easy_calls();
+    ~easy_calls();
+    easy_calls(const easy_calls &) = delete;
+    easy_calls &operator=(const easy_calls &) = delete;
+
+    size_t failing_inits = 0;                            // how many handles cannot be made at first
+    CURLoption refused = CURLOPT_LASTENTRY;              // which option is refused
+    std::function<CURLcode(size_t performance)> perform; // instead of a transfer, counted from 1
+
+    size_t inits = 0;
+    size_t performances = 0;
+    size_t cleanups = 0;
+    std::vector<easy_option> options;            // in the order of the calls
+    char *error_buffer = nullptr;                // the last that was set
+    std::vector<std::string> error_buffer_texts; // what each held when it was set
+
+    // The options alone, without those that a test says are beside its point.
+    std::vector<CURLoption> names(const std::vector<CURLoption> &without = {}) const;
+    bool has(CURLoption option) const;
+    const easy_option &last(CURLoption option) const; // fails if it was never set
+};
+
+} // namespace quillmere_test

@@ -1,0 +1,68 @@
+#include "session_file.h"
+
+#include <nlohmann/json.hpp>
+
+#include "console.h"
+#include "failure.h"
+#include "private_file.h"
+
+namespace quillmere::tools {
+
+namespace {
+
+constexpr const char *what = "the session file";
+
+std::string text_of(const nlohmann::json &document, const char *key)
+{
+    const auto found = document.find(key);
+    return found != document.end() && found->is_string() ? found->get<std::string>() : "";
+}
+
+session read_session(const std::string &text, const std::string &path)
+{
+    const nlohmann::json document = nlohmann::json::parse(text, nullptr, false);
+    session current;
+    if (document.is_object()) {
+        current.service = text_of(document, "service");
+        current.email = text_of(document, "email");
+        current.token = text_of(document, "session_token");
+    }
+    if (current.service.empty() || current.token.empty())
+        throw failure(exit_code::local_file, std::string(what) + " " + path + " is damaged",
+                      "sign in again with: quillmere login");
+    return current;
+}
+
+} // namespace
+
+std::string session_path(const environment &surroundings)
+{
+    return surroundings.directory("XDG_STATE_HOME", ".local/state") + "/quillmere/session.json";
+}
+
+std::optional<session> session_file::load() const
+{
+    const auto found = read_private_file(path_, what);
+    if (!found)
+        return std::nullopt;
+    if (found->found == privacy::repaired)
+        warn("other users could read the session file " + path_ +
+             "; they no longer can, but sign in again if they may have");
+    return read_session(found->text, path_);
+}
+
+void session_file::save(const session &current) const
+{
+    const nlohmann::ordered_json document = {
+        {"service", current.service}, {"email", current.email}, {"session_token", current.token}};
+    // Bytes that are no UTF-8 cannot stand in JSON, and a token with other bytes is another token.
+    try {
+        write_private_file(path_, document.dump(2) + "\n", what);
+    } catch (const nlohmann::json::exception &) {
+        throw failure(exit_code::unreadable_answer, "the service gave a token that is no text");
+    }
+}
+
+bool session_file::remove() const { return remove_file(path_, what); }
+
+} // namespace quillmere::tools
