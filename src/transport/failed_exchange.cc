@@ -16,11 +16,11 @@ heap_text failed_exchange_message(int64_t response_code)
     if (response_code < 1)
         return heap_text(string_dup("Response error: no server HTTP response code received"));
 
-    constexpr size_t message_size = 64;
+    constexpr size_t message_size = 64; // holds any number of this width
     heap_text message(static_cast<char *>(allocate_zeroed(message_size)));
     std::snprintf(message.get(), message_size,
-                  "Response error: received server HTTP response code %li",
-                  static_cast<long>(response_code));
+                  "Response error: received server HTTP response code %d",
+                  static_cast<int32_t>(response_code));
     return message;
 }
 
