@@ -42,6 +42,20 @@ const struct layout_entry layout_entries[] = {
     FIELD(node_value_state, path, 24, 8),
     SIZE(node_value_state, 32),
 
+    FIELD(send_file, handle, 0, 8),
+    FIELD(send_file, timeout, 8, 8),
+    FIELD(send_file, socket, 16, 4),
+    FIELD(send_file, last_transmission, 24, 8),
+    SIZE(send_file, 32),
+
+    FIELD(api_request, url, 0, 8),
+    FIELD(api_request, post_data, 8, 8),
+    FIELD(api_request, response, 16, 8),
+    FIELD(api_request, response_length, 24, 8),
+    FIELD(api_request, timeout, 32, 8),
+    FIELD(api_request, verbose, 40, 4),
+    SIZE(api_request, 48),
+
     SIZE(ssl_disabled, 4),
     SIZE(urls, 4 * sizeof(char *)),
     SIZE(qm_status, 4),

@@ -38,6 +38,7 @@ const char **const uris[] = {
     &get_links_uri,
     &get_download_link_uri,
     &get_device_changes_uri,
+    &update_file_uri,
 };
 // clang-format on
 

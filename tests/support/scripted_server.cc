@@ -35,20 +35,32 @@ struct loopback_address {
             throw std::invalid_argument("no address: " + text);
         }
     }
+    // The port stands at the same place in both families.
+    uint16_t port() const
+    {
+        return ntohs(reinterpret_cast<const sockaddr_in *>(&storage)->sin_port);
+    }
+    void take(uint16_t wanted)
+    {
+        reinterpret_cast<sockaddr_in *>(&storage)->sin_port = htons(wanted);
+    }
     sockaddr *generic() { return reinterpret_cast<sockaddr *>(&storage); }
 };
 
-// A socket bound to a port that the kernel picked; port receives it.
+// A socket bound to the port, or to one that the kernel picks for 0; port receives it.
 descriptor bound_socket(const std::string &text, uint16_t &port)
 {
     loopback_address address(text);
     int kind = SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC;
     descriptor socket(::socket(address.storage.ss_family, kind, 0));
     require(bool(socket), "socket");
+    address.take(port);
+    int yes = 1; // a port that was chosen must not stay taken by a connection that has ended
+    if (port != 0)
+        ::setsockopt(socket.number(), SOL_SOCKET, SO_REUSEADDR, &yes, sizeof yes);
     require(::bind(socket.number(), address.generic(), address.length) == 0, "bind " + text);
     require(::getsockname(socket.number(), address.generic(), &address.length) == 0, "getsockname");
-    // The port stands at the same place in both families.
-    port = ntohs(reinterpret_cast<sockaddr_in *>(&address.storage)->sin_port);
+    port = address.port();
     return socket;
 }
 
@@ -80,7 +92,22 @@ server_options on_address(std::string address, server_options options)
     return options;
 }
 
-scripted_server::scripted_server(server_options options) : options_(std::move(options))
+server_options on_port(uint16_t port, server_options options)
+{
+    options.port = port;
+    return options;
+}
+
+std::string address_of_this_process()
+{
+    // All of 127.0.0.0/8 is the loopback interface's. Process numbers have 22 bits at most.
+    auto number = static_cast<unsigned>(::getpid());
+    return "127." + std::to_string(128 + (number >> 16 & 0x7f)) + "." +
+           std::to_string(number >> 8 & 0xff) + "." + std::to_string(number & 0xff);
+}
+
+scripted_server::scripted_server(server_options options)
+    : options_(std::move(options)), port_(options_.port)
 {
     answer(http_reply(500, "the test gave this server no script"));
     stop_ = descriptor(::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK));

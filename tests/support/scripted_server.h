@@ -76,10 +76,16 @@ connection_script stalling();  // reads the request and never answers
 struct server_options {
     std::shared_ptr<SSL_CTX> tls; // none: a plain server
     std::string address = "127.0.0.1";
+    uint16_t port = 0; // 0: one that the kernel picks
 };
 
 server_options tls_with(const certificate &leaf);
 server_options on_address(std::string address, server_options options = {});
+
+// For what always goes to one port. An address of the test process's own keeps tests that run at
+// the same time apart.
+server_options on_port(uint16_t port, server_options options = {});
+std::string address_of_this_process();
 
 class scripted_server {
 public:
@@ -135,7 +141,7 @@ private:
     server_options options_;
     descriptor listener_;
     descriptor stop_;
-    uint16_t port_ = 0;
+    uint16_t port_;
 
     mutable std::mutex mutex_; // guards everything below but the acceptor
     std::condition_variable changed_;

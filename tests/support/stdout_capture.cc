@@ -1,6 +1,7 @@
 #include "support/stdout_capture.h"
 
 #include <fcntl.h>
+#include <gtest/gtest.h>
 #include <sys/mman.h>
 #include <unistd.h>
 
@@ -33,8 +34,11 @@ stdout_capture::stdout_capture()
 
 stdout_capture::~stdout_capture()
 {
+    // A failure was reported on standard output, too.
+    std::string lost = testing::Test::HasFailure() ? text() : std::string();
     flush_standard_output();
     ::dup2(before_.number(), STDOUT_FILENO);
+    std::fwrite(lost.data(), 1, lost.size(), stdout);
 }
 
 std::string stdout_capture::text() const

@@ -5,7 +5,8 @@
 #include <cstring>
 #include <stdexcept>
 
-#undef curl_easy_setopt // a macro in some headers
+#undef curl_easy_setopt // macros in some headers
+#undef curl_easy_getinfo
 
 namespace quillmere_test {
 namespace {
@@ -75,18 +76,23 @@ extern "C" {
 CURL *real_init() __asm__("__real_curl_easy_init");
 CURLcode real_setopt(CURL *handle, CURLoption option, ...) __asm__("__real_curl_easy_setopt");
 CURLcode real_perform(CURL *handle) __asm__("__real_curl_easy_perform");
+CURLcode real_getinfo(CURL *handle, CURLINFO info, ...) __asm__("__real_curl_easy_getinfo");
 void real_cleanup(CURL *handle) __asm__("__real_curl_easy_cleanup");
 
 CURL *watched_init() __asm__("__wrap_curl_easy_init");
 CURLcode watched_setopt(CURL *handle, int number, ...) __asm__("__wrap_curl_easy_setopt");
 CURLcode watched_perform(CURL *handle) __asm__("__wrap_curl_easy_perform");
+CURLcode watched_getinfo(CURL *handle, int number, ...) __asm__("__wrap_curl_easy_getinfo");
 void watched_cleanup(CURL *handle) __asm__("__wrap_curl_easy_cleanup");
 
 CURL *watched_init()
 {
     if (current && ++current->inits <= current->failing_inits)
         return nullptr;
-    return real_init();
+    CURL *handle = real_init();
+    if (current)
+        current->handles.push_back(handle);
+    return handle;
 }
 
 // Every value that the library passes is as wide as a pointer. The option is taken as an int, as it
@@ -103,6 +109,8 @@ CURLcode watched_setopt(CURL *handle, int number, ...)
         return CURLE_BAD_FUNCTION_ARGUMENT;
     if (current)
         note(option, value);
+    if (option == CURLOPT_PORT && current && current->other_port != 0)
+        return real_setopt(handle, option, current->other_port);
     return real_setopt(handle, option, value);
 }
 
@@ -112,6 +120,19 @@ CURLcode watched_perform(CURL *handle)
         return real_perform(handle);
     ++current->performances;
     return current->perform ? current->perform(current->performances) : real_perform(handle);
+}
+
+// What receives the answer is a pointer, whatever the question.
+CURLcode watched_getinfo(CURL *handle, int number, ...)
+{
+    va_list arguments;
+    va_start(arguments, number);
+    void *answer = va_arg(arguments, void *);
+    va_end(arguments);
+    auto info = static_cast<CURLINFO>(number);
+    if (current && current->refused_info == info)
+        return CURLE_UNKNOWN_OPTION;
+    return real_getinfo(handle, info, answer);
 }
 
 void watched_cleanup(CURL *handle)

@@ -1,39 +1,10 @@
 // A peer that goes away in the middle of an upload must not end the program.
-#include <csignal>
-
-#include <signal.h>
-
 #include "support/library_fixture.h"
 #include "transport/exchange.h"
+#include "transport/pipe_signals.h"
 
 namespace quillmere_test {
 namespace {
-
-volatile std::sig_atomic_t pipe_signals = 0;
-
-extern "C" {
-static void count_signal(int) { pipe_signals = pipe_signals + 1; }
-}
-
-// Counts SIGPIPE, of which the library leaves the disposition alone.
-class pipe_signal_counter {
-public:
-    pipe_signal_counter()
-    {
-        pipe_signals = 0;
-        struct sigaction counting = {};
-        counting.sa_handler = count_signal;
-        sigaction(SIGPIPE, &counting, &before_);
-    }
-    ~pipe_signal_counter() { sigaction(SIGPIPE, &before_, nullptr); }
-    pipe_signal_counter(const pipe_signal_counter &) = delete;
-    pipe_signal_counter &operator=(const pipe_signal_counter &) = delete;
-
-    int count() const { return pipe_signals; }
-
-private:
-    struct sigaction before_ = {};
-};
 
 struct departure {
     const char *name;
