@@ -171,7 +171,7 @@ file copy_file(database &store, const file &source, const folder &destination, s
 {
     check_storage(store, destination.account, source.content.size);
     const std::string name = free_name(store, destination.id, source.name);
-    const file made = copy_file_row(store, source, destination, name, now);
+    file made = copy_file_row(store, source, destination, name, now);
     record_file(store, made.id, destination.id, feed_kind::updated);
     return made;
 }

@@ -140,7 +140,7 @@ folder copy_folder(database &store, const folder &source, const folder &destinat
     check_destination(store, source, destination);
     check_storage(store, destination.account, totals_of(store, source.id).size);
     const std::string name = free_name(store, destination.id, source.name);
-    const folder made = copy_rows(store, source, destination, name, now);
+    folder made = copy_rows(store, source, destination, name, now);
     record_tree(store, made.id, feed_kind::updated);
     return made;
 }
