@@ -492,9 +492,9 @@ QM_API char *normalize_url(const char *url, const char *scheme);
  *   - One call moves at most one chunk: call again until everything is sent.
  *   - A connection may idle for 60 seconds; after that reads and writes fail until it is deleted.
  *   - With TLS the port is always 443, whatever the URL says, and use_tls must agree with the URL's
- * scheme.
+ *     scheme.
  *   - With TLS a read buffer should hold a whole TLS record, 16 KiB (RFC 8446): readiness is asked
- * of the socket, which knows nothing of bytes that the TLS library has taken in already.
+ *     of the socket, which knows nothing of bytes that the TLS library has taken in already.
  *   - The proxy and ssl_disabled are not applied, deliberately.
  *   - Messages go to standard output, not to the diagnostic log.
  * ---------------------------------------------------------------------------------------------- */
@@ -513,10 +513,10 @@ typedef struct send_file {
  * @param connection receives the connection, or NULL
  * @param url        where to connect to
  * @param use_tls    non-zero for TLS on port 443, verified against ca_cert_pem_path.path; without a
- * path the peer's certificate is not verified
+ *                   path the peer's certificate is not verified
  * @param timeout    seconds for connecting; below 1 means 60
  * @return 0; -1 if connecting failed; -2 if the socket is unknown; -200 if libcurl made no handle.
- * Blocks. Any thread.
+ *         Blocks. Any thread.
  */
 QM_API int32_t send_file_new(send_file **connection, const char *url, int32_t use_tls,
                              int64_t timeout);
@@ -526,7 +526,7 @@ QM_API int32_t send_file_new(send_file **connection, const char *url, int32_t us
  *
  * @param size their number; of 0 bytes none are sent and the time of the last transmission stays
  * @return the number sent, which may be smaller; -5 if nothing could be sent for 60 seconds; -6 if
- * sending failed
+ *         sending failed
  */
 QM_API int32_t send_file_write(send_file *connection, const void *data, uint64_t size);
 
@@ -535,7 +535,7 @@ QM_API int32_t send_file_write(send_file *connection, const void *data, uint64_t
  *
  * @param size room in the buffer
  * @return the number received; 0 if the peer has closed the connection; -5 if nothing came for 60
- * seconds; -7 if receiving failed
+ *         seconds; -7 if receiving failed
  */
 QM_API int32_t send_file_read(send_file *connection, void *buffer, uint64_t size);
 
@@ -550,7 +550,7 @@ QM_API uint64_t send_file_seconds_since_last_transmission(const send_file *conne
  * Makes this moment the time of the last transmission.
  *
  * @return seconds since the epoch, or -1 if the clock cannot be read, in which case nothing is
- * changed
+ *         changed
  */
 QM_API int64_t send_file_update_connection_last_timestamp(send_file *connection);
 
@@ -687,10 +687,10 @@ QM_API api_request *api_request_new(void);
  *
  * @param request the request, which then holds the response
  * @param message receives the message of a failure, the caller's to free; left as it was otherwise,
- * so set it to NULL beforehand. Must not be NULL
+ *                so set it to NULL beforehand. Must not be NULL
  * @return QM_OK, the service's own error number, QM_NO_RESPONSE, QM_UNUSABLE_RESPONSE,
- * QM_UNUSABLE_ERROR_NUMBER or QM_MALFORMED_REPLY, which overrides the others. The error hook is
- * called with refusals alone.
+ *         QM_UNUSABLE_ERROR_NUMBER or QM_MALFORMED_REPLY, which overrides the others. The error
+ *         hook is called with refusals alone.
  *
  * Blocks. Any thread, each with a request of its own.
  */
@@ -1548,9 +1548,9 @@ QM_API char *get_patch_upload_url(const char *session_token, const char *quick_k
  * @param reply      the bytes that were received
  * @param length     their number
  * @param upload_key receives the upload's key or NULL, also for a refused upload; the caller frees
- * it
+ *                   it
  * @return 0 if the upload was accepted; -1 if not, or if the reply is shorter than 4 bytes;
- * QM_MALFORMED_REPLY. Any thread.
+ *         QM_MALFORMED_REPLY. Any thread.
  */
 QM_API int32_t parse_upload_response(const char *reply, uint64_t length, char **upload_key);
 
