@@ -128,7 +128,7 @@ int32_t send_file_new(send_file **connection, const char *url, int32_t use_tls, 
     }
     long socket = -1;
     if (curl_easy_getinfo(handle.get(), CURLINFO_LASTSOCKET, &socket) != CURLE_OK) {
-        handle.release(); // dropped as it is, deliberately
+        static_cast<void>(handle.release()); // dropped as it is, deliberately
         return socket_unknown;
     }
 
