@@ -14,6 +14,12 @@ if(QUILLMERE_WARNINGS_AS_ERRORS)
     target_compile_options(quillmere_compiler_options INTERFACE -Werror)
 endif()
 
+# What ships does not tell where it was built, so that two builds of one commit are the same byte for byte. Builds for
+# debugging keep the paths, by which debuggers and coverage find the sources.
+target_compile_options(quillmere_compiler_options INTERFACE
+    "$<$<NOT:$<CONFIG:Debug>>:-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=;-ffile-prefix-map=${PROJECT_BINARY_DIR}=build>")
+set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
+
 if(QUILLMERE_SANITIZERS)
     set(sanitize -fsanitize=${QUILLMERE_SANITIZERS} -fno-omit-frame-pointer)
     if(QUILLMERE_SANITIZERS MATCHES "undefined")
@@ -23,3 +29,13 @@ if(QUILLMERE_SANITIZERS)
     add_compile_options(${sanitize})
     add_link_options(${sanitize})
 endif()
+
+# quillmere_precompile(target header...): large headers of other projects, which every source of a target would read
+# anew. The sources include what they use all the same, since not every build does this.
+function(quillmere_precompile target)
+    if(QUILLMERE_PRECOMPILED_HEADERS)
+        list(TRANSFORM ARGN PREPEND "$<$<COMPILE_LANGUAGE:CXX>:<")
+        list(TRANSFORM ARGN APPEND "$<ANGLE-R>>")
+        target_precompile_headers(${target} PRIVATE ${ARGN})
+    endif()
+endfunction()

@@ -320,6 +320,8 @@ QM_API string_buffer *string_new(uint64_t capacity);
  *
  * @param buffer the buffer; for string_append_urlencode_obfs it must not be NULL
  * @param text   what to append; must not be a part of the buffer's own text
+ * @param bytes  the same for string_append_len
+ * @param count  number of those bytes
  * @return the new length, or -1 if buffer or text is NULL
  *
  * string_append_urlencode_obfs adds a range even when its text is NULL; that range hides nothing.
@@ -348,6 +350,7 @@ QM_API uint64_t string_get_size(const string_buffer *buffer);
 /**
  * The text as it may be logged: each unbroken stretch of marked bytes is replaced by a marker.
  *
+ * @param buffer      the buffer
  * @param replacement the marker, or NULL for "(omitted)"
  * @return the buffer's own text if it has no ranges; otherwise a copy, borrowed until the next call
  *         on this buffer or its end
@@ -357,7 +360,8 @@ QM_API const char *string_get_obfs(string_buffer *buffer, const char *replacemen
 /**
  * Cuts bytes off the end of the text.
  *
- * @param count bytes to cut; more than there are empties the text
+ * @param buffer the buffer
+ * @param count  bytes to cut; more than there are empties the text
  * @return the new length
  */
 QM_API int64_t string_reduce(string_buffer *buffer, uint64_t count);
@@ -365,6 +369,7 @@ QM_API int64_t string_reduce(string_buffer *buffer, uint64_t count);
 /**
  * Releases a buffer. NULL is ignored.
  *
+ * @param buffer    the buffer, or NULL
  * @param free_text 1 frees the text too; any other value leaves it to the caller, who took it with
  *                  string_get() and frees it with free()
  */
@@ -389,7 +394,9 @@ QM_API int32_t url_acceptable_letter(int32_t character);
 /**
  * Appends a number, which is unsigned: -1 becomes 18446744073709551615.
  *
- * @param base 2 to 16, not checked; digits above 9 are lower-case letters
+ * @param buffer the buffer
+ * @param number the number
+ * @param base   2 to 16, not checked; digits above 9 are lower-case letters
  * @return the new length, or -1 if buffer is NULL
  *
  * At most 63 digits are written, so that in base 2 a number of 2^63 and more loses its first digit.
@@ -400,6 +407,8 @@ QM_API int64_t string_append_num_base(string_buffer *buffer, uint64_t number, in
 /**
  * Renders a number as string_append_num_base() does, into storage of the caller's.
  *
+ * @param number  the number
+ * @param base    as there
  * @param scratch at least 65 bytes; the digits end at index 63 and the NUL stands at index 64
  * @return the first digit, within scratch. Any thread.
  */
@@ -446,6 +455,9 @@ QM_API int64_t get_response_from_url(const char *url, const void *body, uint64_t
 /**
  * libcurl's write callback: appends size * count bytes to a string buffer.
  *
+ * @param data   the bytes
+ * @param size   size of an item
+ * @param count  number of items
  * @param buffer the string_buffer
  * @return size * count: a transfer is never stopped from here
  */
@@ -454,6 +466,7 @@ QM_API size_t curl_write_function(char *data, size_t size, size_t count, void *b
 /**
  * Probes a URL once, with a HEAD request. ssl_disabled plays no part.
  *
+ * @param url                  the whole URL
  * @param timeout_milliseconds rounded away from zero to whole seconds; 0 for none
  * @return 1 if the status code is 200 to 399, else 0, which is logged. Blocks. Any thread.
  */
@@ -524,7 +537,10 @@ QM_API int32_t send_file_new(send_file **connection, const char *url, int32_t us
 /**
  * Sends some of the bytes given, waiting for room.
  *
- * @param size their number; of 0 bytes none are sent and the time of the last transmission stays
+ * @param connection the connection
+ * @param data       the bytes
+ * @param size       their number; of 0 bytes none are sent and the time of the last transmission
+ *                   stays
  * @return the number sent, which may be smaller; -5 if nothing could be sent for 60 seconds; -6 if
  *         sending failed
  */
@@ -533,7 +549,9 @@ QM_API int32_t send_file_write(send_file *connection, const void *data, uint64_t
 /**
  * Receives some bytes, waiting for them.
  *
- * @param size room in the buffer
+ * @param connection the connection
+ * @param buffer     receives the bytes
+ * @param size       room in the buffer
  * @return the number received; 0 if the peer has closed the connection; -5 if nothing came for 60
  *         seconds; -7 if receiving failed
  */
@@ -598,7 +616,8 @@ QM_API void simple_get_xml_node_value_data(void *state, const char *text, int32_
  * Appends text to a malloc'ed, NUL-terminated value, allocating it if it is NULL.
  *
  * @param value  the value, which may move
- * @param text   length bytes, which need no NUL
+ * @param text   the text, which needs no NUL
+ * @param length its length in bytes
  */
 QM_API void node_value_data_accumulate(char **value, const char *text, int32_t length);
 
@@ -714,10 +733,33 @@ QM_API void api_request_delete(api_request **request);
  *   <record>_delete       frees *record and its texts, and deliberately leaves the pointer as it
  *                         was. NULL, or a pointer to NULL, does nothing.
  *
- * A record may be read on several threads at once.
+ * A record may be read on several threads at once. What the texts mean in detail, and in which
+ * units the figures are, is up to the service.
  * ---------------------------------------------------------------------------------------------- */
 
-/** What the service knows of one file. Opaque, and never changed once handed out. */
+/**
+ * What the service knows of one file. Opaque, and never changed once handed out.
+ *
+ *   quickkey            the key by which operations name the file
+ *   parent_folderkey    key of the folder that it lies in
+ *   filename            its name
+ *   created             when it was made
+ *   downloads           how often it was downloaded
+ *   desc                its description
+ *   tags                its tags
+ *   size                its length in bytes
+ *   privacy             "public" or "private"
+ *   type                the kind of file that it is, element "filetype"
+ *   mimetype            its media type
+ *   hash                digest of its content, in hexadecimal
+ *   delete_date         when it was deleted, if it was
+ *   password_protected  whether a password protects it
+ *   revision            the revision of the account in which it changed last
+ *   owner_name          name of its owner
+ *   flag                a number by which the service marks it
+ *   shared_by_user      whether it is the account that shares it
+ *   permissions         what the account may do with it
+ */
 typedef struct file_info file_info;
 
 QM_API file_info *file_info_new(const char *quickkey, const char *parent_folderkey,
@@ -749,7 +791,34 @@ QM_API const char *file_info_get_shared_by_user(const file_info *record);
 QM_API const char *file_info_get_permissions(const file_info *record);
 QM_API void file_info_delete(file_info **record);
 
-/** What the service knows of one folder. Opaque, and never changed once handed out. */
+/**
+ * What the service knows of one folder. Opaque, and never changed once handed out.
+ *
+ *   folderkey         the key by which operations name the folder
+ *   foldername        its name
+ *   created           when it was made
+ *   desc              its description
+ *   tags              its tags
+ *   foldercount       number of folders directly in it
+ *   filecount         number of files directly in it
+ *   total_files       number of files in it at any depth
+ *   total_folders     number of folders in it at any depth
+ *   total_size        bytes of the files in it at any depth
+ *   revision          the revision of the account in which it changed last
+ *   epoch             epoch of the account's file tree
+ *   shared            whether another account sees it
+ *   owner_name        name of its owner
+ *   parent_folderkey  key of the folder that it lies in
+ *   delete_date       when it was deleted, if it was
+ *   custom_url        an address of its own, if it was given one
+ *   dbx_enabled       whether it is linked with Dropbox, element "dropbox_enabled"
+ *   flag              a number by which the service marks it
+ *   shared_by_user    whether it is the account that shares it
+ *   permissions       what the account may do with it
+ *   avatar            address of its picture
+ *   privacy           "public" or "private"
+ *   byte_count        bytes of the files directly in it
+ */
 typedef struct folder_info folder_info;
 
 QM_API folder_info *
@@ -789,7 +858,48 @@ QM_API void folder_info_delete(folder_info **record);
 
 /**
  * The account. The fb_ and tw_ texts describe a linked Facebook and Twitter account, and are NULL
- * when none is linked. Opaque, and never changed once handed out.
+ * when none is linked, but for fb_linked and tw_linked. Opaque, and never changed once handed out.
+ *
+ *   email                   e-mail address
+ *   first_name              first name
+ *   last_name               last name
+ *   display_name            the name that others see
+ *   gender                  gender
+ *   birthdate               date of birth, element "birth_date"
+ *   location                place
+ *   website                 address of a web site
+ *   premium                 whether the account is a paid one
+ *   bandwidth               bandwidth that is left
+ *   created                 when the account was made
+ *   max_upload              greatest length of an upload, element "max_upload_size"
+ *   max_instant_upload      the same for an upload by digest alone, element
+ *                           "max_instant_upload_size"
+ *   validated               whether the e-mail address was confirmed
+ *   tos_accepted            which terms of service were accepted
+ *   used_storage            storage in use, element "used_storage_size"
+ *   base_storage            storage that comes with the account
+ *   bonus_storage           storage that was added to it
+ *   storage_limit           both together
+ *   storage_limit_exceeded  whether more is in use than that
+ *   options                 options of the account
+ *   fb_facebook_id          id of the Facebook account
+ *   fb_date_created         when it was linked
+ *   fb_email                its e-mail address
+ *   fb_facebook_url         address of its page
+ *   fb_name                 its full name
+ *   fb_firstname            its first name
+ *   fb_lastname             its last name
+ *   fb_hometown             its home town
+ *   fb_location             its place
+ *   fb_i18n                 its language and country
+ *   fb_timezone             its time zone
+ *   fb_linked               "yes" if a Facebook account is linked
+ *   tw_twitter_id           id of the Twitter account
+ *   tw_date_created         when it was linked
+ *   tw_screen_name          its handle
+ *   tw_name                 its full name
+ *   tw_i18n                 its language and country
+ *   tw_linked               "yes" if a Twitter account is linked
  */
 typedef struct user_info user_info;
 
@@ -848,7 +958,22 @@ QM_API const char *user_info_get_tw_i18n(const user_info *record);
 QM_API const char *user_info_get_tw_linked(const user_info *record);
 QM_API void user_info_delete(user_info **record);
 
-/** The account's quotas, and how much of them is used. Opaque, and never changed once handed out.
+/**
+ * The account's quotas, and how much of them is used. Opaque, and never changed once handed out.
+ *
+ *   storage_base               storage that comes with the account
+ *   storage_bonus              storage that was added to it
+ *   storage_limit              both together
+ *   storage_used               storage in use
+ *   bandwidth_limit            bandwidth of the account
+ *   bandwidth_used             how much of it is used
+ *   collaboration_limit        shares that may be made in a day
+ *   collaboration_today        shares made today
+ *   one_time_downloads_limit   downloads by one-time links that a day allows
+ *   one_time_downloads_today   such downloads today
+ *   streaming_bandwidth_limit  bandwidth for streams in a day
+ *   streaming_bandwidth_today  how much of it is used today
+ *   upload_size_limit          greatest length of an upload
  */
 typedef struct user_limits user_limits;
 
@@ -874,7 +999,20 @@ QM_API const char *user_limits_get_streaming_bandwidth_today(const user_limits *
 QM_API const char *user_limits_get_upload_size_limit(const user_limits *record);
 QM_API void user_limits_delete(user_limits **record);
 
-/** Limits of the service as a whole. Opaque, and never changed once handed out. */
+/**
+ * Limits of the service as a whole. Opaque, and never changed once handed out.
+ *
+ *   max_objects                files and folders in one request
+ *   max_keys                   keys in one request
+ *   max_image_size             greatest length of an image
+ *   zip_max_filesize           greatest length of a file in an archive to download
+ *   zip_max_total_filesize     greatest length of all files in such an archive
+ *   folder_content_chunk_size  entries in a chunk of a listing
+ *   folder_depth_limit         levels of folders below the root
+ *   limit_search_results       entries that a search finds
+ *   daily_shares_limit         shares that an account may make in a day
+ *   device_changes_list_limit  changes in one reply of the change feed
+ */
 typedef struct system_limits system_limits;
 
 QM_API system_limits *
@@ -895,7 +1033,12 @@ QM_API const char *system_limits_get_daily_shares_limit(const system_limits *rec
 QM_API const char *system_limits_get_device_changes_list_limit(const system_limits *record);
 QM_API void system_limits_delete(system_limits **record);
 
-/** Health of the service's back ends. Opaque, and never changed once handed out. */
+/**
+ * Health of the service's back ends. Opaque, and never changed once handed out.
+ *
+ *   database  state of the database
+ *   memcache  state of the cache
+ */
 typedef struct system_status system_status;
 
 QM_API system_status *system_status_new(const char *database, const char *memcache);
@@ -906,8 +1049,15 @@ QM_API void system_status_delete(system_status **record);
 /**
  * One entry of the device change feed. Opaque, and never changed once handed out.
  *
- * key is the quick key of a file or the folder key of a folder; is_folder tells which, 1 for a
- * folder. changetype is 1 for an entry that was created or changed and 0 for one that was deleted.
+ *   key               quick key of a file, or folder key of a folder
+ *   parent_folderkey  key of the folder that it lies in
+ *   created           when it was made
+ *   revision          the revision of the account in which it changed
+ *   is_folder         1 for a folder, 0 for a file
+ *   changetype        1 for what was created or changed, 0 for what was deleted
+ *   filename          its name
+ *   mimetype          media type of a file
+ *   filetype          the kind of file that it is
  */
 typedef struct change_info change_info;
 
@@ -926,7 +1076,23 @@ QM_API const char *change_info_get_mimetype(const change_info *record);
 QM_API const char *change_info_get_filetype(const change_info *record);
 QM_API void change_info_delete(change_info **record);
 
-/** The links of one file. Opaque, and never changed once handed out. */
+/**
+ * The links of one file. Opaque, and never changed once handed out.
+ *
+ *   quickkey                         key of the file
+ *   view                             link to look at it
+ *   listen                           link to listen to it
+ *   watch                            link to watch it
+ *   normal_download                  link to the page from which it is downloaded
+ *   direct_download                  link to its bytes
+ *   direct_download_error_message    why there is no direct_download
+ *   direct_download_error            the number of that
+ *   edit                             link to edit it
+ *   edit_error_message               why there is no edit
+ *   one_time_download                link to its bytes that works once
+ *   one_time_download_error_message  why there is no one_time_download
+ *   error                            why there are no links at all
+ */
 typedef struct file_links file_links;
 
 QM_API file_links *file_links_new(const char *quickkey, const char *view, const char *listen,
@@ -1570,6 +1736,30 @@ QM_API int32_t parse_upload_response(const char *reply, uint64_t length, char **
 QM_API int32_t update_file(const char *session_token, const char *quick_key, const char *filename,
                            const char *description, const char *tags, const char *privacy,
                            const char *mtime, char **message);
+
+/* -------------------------------------------------------------------------------------------------
+ * Additions: off by default, so that an application which knows nothing of them sees no difference.
+ * ---------------------------------------------------------------------------------------------- */
+
+/**
+ * The version of the library that runs, such as "0.1.0". It may be newer than this header, whose
+ * version the macros at its head tell.
+ *
+ * @return a text that is never freed. Any thread, at any time.
+ */
+QM_API const char *quillmere_version(void);
+
+/**
+ * Limits the length of a response's body, so that a broken or hostile server cannot fill the
+ * memory. Past the limit an attempt fails as any other does: one line of the log says that the
+ * response is too long, libcurl's own line follows, and what was received is dropped. A response of
+ * exactly that length is taken. It does not concern the connections of send_file_new().
+ *
+ * @param bytes the most bytes that are taken; 0, the initial value, for no limit
+ * @return 0, or 1 for a negative value: that is logged, and the setting stays. Configuration; it
+ *         outlasts api_global_cleanup().
+ */
+QM_API int32_t set_response_limit(int64_t bytes);
 
 #ifdef __cplusplus
 }

@@ -35,6 +35,9 @@ struct change_feed {
             *device_revision = uint64_in(revision.get());
         if (heap_text size = call.text_of(block_size_element))
             *block_size = int32_in(size.get());
+        // The sample too is malformed when expat has no memory to read it.
+        if (call.malformed())
+            delete_all_change_list(changes); // the pointer is left as it was, deliberately
     }
 };
 
@@ -60,8 +63,6 @@ int32_t get_device_changes(const char *session_token, uint64_t revision, uint32_
     call.fetch(url_heading, reply_log::text);
     if (call.accepted())
         feed.read(call, "changes_list_block");
-    if (call.malformed())
-        delete_all_change_list(changes); // the pointer is left as it was, deliberately
     return call.status();
 }
 

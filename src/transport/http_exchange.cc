@@ -5,6 +5,7 @@
 
 #include "owned.h"
 #include "runtime/lifecycle.h"
+#include "transport/response_body.h"
 #include "transport/transfer.h"
 
 namespace quillmere {
@@ -51,19 +52,19 @@ void send_body(CURL *handle, const http_request &request)
 }
 
 // Sets everything up for one attempt; false if libcurl refuses what the attempt cannot do without.
-bool prepare(CURL *handle, const http_request &request, error_text &error, string_buffer *received)
+bool prepare(CURL *handle, const http_request &request, error_text &error, response_body &body)
 {
     share_dns_cache(handle);
     curl_easy_setopt(handle, CURLOPT_ERRORBUFFER, error.text);
     if (!address(handle, request))
         return false;
     restrain_redirects(handle);
+    keep_no_tls_sessions(handle);
     limit_time(handle, request);
     curl_easy_setopt(handle, CURLOPT_NOPROGRESS, 1L);
-    use_proxy(handle);
-    verify_peer(handle);
-    curl_easy_setopt(handle, CURLOPT_WRITEFUNCTION, curl_write_function);
-    curl_easy_setopt(handle, CURLOPT_WRITEDATA, received);
+    if (!use_proxy(handle) || !verify_peer(handle))
+        return false;
+    body.receive_with(handle);
     if (ssl_disabled) {
         curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 0L);
         curl_easy_setopt(handle, CURLOPT_SSL_VERIFYHOST, 0L);
@@ -86,7 +87,8 @@ void report_failure(CURLcode code, const error_text &error)
 int64_t attempt(const http_request &request, error_text &error, string_buffer *received)
 {
     easy_handle handle(curl_easy_init());
-    if (!handle || !prepare(handle.get(), request, error, received))
+    response_body body(received);
+    if (!handle || !prepare(handle.get(), request, error, body))
         return -1;
     CURLcode code = curl_easy_perform(handle.get());
     if (code != CURLE_OK) {

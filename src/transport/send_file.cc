@@ -12,6 +12,7 @@
 
 #include "owned.h"
 #include "runtime/memory.h"
+#include "transport/transfer.h"
 
 namespace quillmere {
 
@@ -30,7 +31,7 @@ constexpr int32_t send_failed = -6;
 constexpr int32_t receive_failed = -7;
 
 // The proxy and ssl_disabled are for the operations, deliberately: they are not applied here.
-void prepare(CURL *handle, const char *url, bool use_tls, int64_t timeout)
+CURLcode connect(CURL *handle, const char *url, bool use_tls, int64_t timeout)
 {
     curl_easy_setopt(handle, CURLOPT_URL, url);
     curl_easy_setopt(handle, CURLOPT_FOLLOWLOCATION, 1L);
@@ -40,12 +41,12 @@ void prepare(CURL *handle, const char *url, bool use_tls, int64_t timeout)
     if (use_tls) {
         curl_easy_setopt(handle, CURLOPT_PORT, tls_port);
         curl_easy_setopt(handle, CURLOPT_USE_SSL, static_cast<long>(CURLUSESSL_ALL));
-        if (ca_cert_pem_path.path)
-            curl_easy_setopt(handle, CURLOPT_CAINFO, ca_cert_pem_path.path);
-        else
-            curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 0L);
+        keep_no_tls_sessions(handle);
+        if (!verify_peer(handle))
+            return CURLE_OUT_OF_MEMORY;
     }
     curl_easy_setopt(handle, CURLOPT_CONNECT_ONLY, 1L);
+    return curl_easy_perform(handle);
 }
 
 bool read_clock(int64_t &now)
@@ -120,8 +121,7 @@ int32_t send_file_new(send_file **connection, const char *url, int32_t use_tls, 
     if (!handle)
         return no_handle;
 
-    prepare(handle.get(), url, use_tls != 0, timeout);
-    CURLcode code = curl_easy_perform(handle.get());
+    CURLcode code = connect(handle.get(), url, use_tls != 0, timeout);
     if (code != CURLE_OK) {
         std::printf("Curl error: %s\n", curl_easy_strerror(code));
         return connect_failed;

@@ -24,6 +24,12 @@ static int keep_encrypted(void *handle, char *, char *, int, int)
 }
 }
 
+// Whether libcurl had the memory to keep a text. A refusal for any other reason stops no transfer.
+bool keep(CURL *handle, CURLoption option, const char *text)
+{
+    return curl_easy_setopt(handle, option, text) != CURLE_OUT_OF_MEMORY;
+}
+
 } // namespace
 
 void share_dns_cache(CURL *handle)
@@ -42,24 +48,30 @@ void restrain_redirects(CURL *handle)
     curl_easy_setopt(handle, CURLOPT_PREREQDATA, handle);
 }
 
-void use_proxy(CURL *handle)
+void keep_no_tls_sessions(CURL *handle)
 {
-    if (!proxy_server.enabled)
-        return;
-    curl_easy_setopt(handle, CURLOPT_PROXY, proxy_server.host);
-    curl_easy_setopt(handle, CURLOPT_PROXYPORT, static_cast<long>(proxy_server.port));
-    if (proxy_server.user)
-        curl_easy_setopt(handle, CURLOPT_PROXYUSERNAME, proxy_server.user);
-    if (proxy_server.password)
-        curl_easy_setopt(handle, CURLOPT_PROXYPASSWORD, proxy_server.password);
+    curl_easy_setopt(handle, CURLOPT_SSL_SESSIONID_CACHE, 0L);
 }
 
-void verify_peer(CURL *handle)
+bool use_proxy(CURL *handle)
+{
+    if (!proxy_server.enabled)
+        return true;
+    bool kept = keep(handle, CURLOPT_PROXY, proxy_server.host);
+    curl_easy_setopt(handle, CURLOPT_PROXYPORT, static_cast<long>(proxy_server.port));
+    if (proxy_server.user)
+        kept &= keep(handle, CURLOPT_PROXYUSERNAME, proxy_server.user);
+    if (proxy_server.password)
+        kept &= keep(handle, CURLOPT_PROXYPASSWORD, proxy_server.password);
+    return kept;
+}
+
+bool verify_peer(CURL *handle)
 {
     if (ca_cert_pem_path.path)
-        curl_easy_setopt(handle, CURLOPT_CAINFO, ca_cert_pem_path.path);
-    else
-        curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 0L);
+        return keep(handle, CURLOPT_CAINFO, ca_cert_pem_path.path);
+    curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 0L);
+    return true;
 }
 
 void log_failure(CURLcode code, const error_text &error)

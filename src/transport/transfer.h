@@ -14,11 +14,19 @@ void share_dns_cache(CURL *handle);
 // caller's choice.
 void restrain_redirects(CURL *handle);
 
-void use_proxy(CURL *handle);
+// Has libcurl remember no TLS session. A handle makes a single transfer here, so that a session
+// could serve nobody but a redirect, and when memory runs out while one is stored, libcurl (7.88 at
+// least) frees its host name twice.
+void keep_no_tls_sessions(CURL *handle);
+
+// This and verify_peer() are false when libcurl had no memory to keep what they set. The transfer
+// must not take place then: it would go past the proxy, or trust the certificates of libcurl's own
+// choice.
+[[nodiscard]] bool use_proxy(CURL *handle);
 
 // Verifies the peer against the configured certificates, or, without any, not at all. The host name
 // is checked in either case.
-void verify_peer(CURL *handle);
+[[nodiscard]] bool verify_peer(CURL *handle);
 
 // libcurl's text for the last failure of one call. It starts empty and then keeps what libcurl
 // writes.

@@ -3,6 +3,7 @@
 #include <cstring>
 
 #include "owned.h"
+#include "transport/response_body.h"
 #include "transport/transfer.h"
 
 namespace quillmere {
@@ -39,6 +40,24 @@ long perform(CURL *handle, const error_text &error)
     return response_code;
 }
 
+// Sets everything up; false if libcurl refuses what the probe cannot do without.
+bool prepare(CURL *handle, const char *url, probe_method method, int32_t timeout_milliseconds,
+             error_text &error, response_body &body)
+{
+    share_dns_cache(handle);
+    curl_easy_setopt(handle, CURLOPT_ERRORBUFFER, error.text);
+    if (!address(handle, url, method))
+        return false;
+    restrain_redirects(handle);
+    keep_no_tls_sessions(handle);
+    curl_easy_setopt(handle, CURLOPT_TIMEOUT,
+                     static_cast<long>(whole_seconds(timeout_milliseconds)));
+    if (method == probe_method::get)
+        body.receive_with(handle);
+    curl_easy_setopt(handle, CURLOPT_NOPROGRESS, 1L);
+    return use_proxy(handle) && verify_peer(handle);
+}
+
 // The response code, or -1. A HEAD probe receives no body, so received is for GET alone.
 long probe(const char *url, probe_method method, int32_t timeout_milliseconds,
            string_buffer *received)
@@ -49,22 +68,11 @@ long probe(const char *url, probe_method method, int32_t timeout_milliseconds,
         return -1;
     }
     error_text error;
-    share_dns_cache(handle.get());
-    curl_easy_setopt(handle.get(), CURLOPT_ERRORBUFFER, error.text);
-    if (!address(handle.get(), url, method)) {
+    response_body body(received);
+    if (!prepare(handle.get(), url, method, timeout_milliseconds, error, body)) {
         qm_printf("cUrl setopt failed.\n");
         return -1;
     }
-    restrain_redirects(handle.get());
-    curl_easy_setopt(handle.get(), CURLOPT_TIMEOUT,
-                     static_cast<long>(whole_seconds(timeout_milliseconds)));
-    if (method == probe_method::get) {
-        curl_easy_setopt(handle.get(), CURLOPT_WRITEFUNCTION, curl_write_function);
-        curl_easy_setopt(handle.get(), CURLOPT_WRITEDATA, received);
-    }
-    curl_easy_setopt(handle.get(), CURLOPT_NOPROGRESS, 1L);
-    use_proxy(handle.get());
-    verify_peer(handle.get());
     return perform(handle.get(), error);
 }
 
