@@ -11,10 +11,12 @@
 #include <boost/beast/http.hpp>
 #include <boost/beast/ssl.hpp>
 
+#include "envelope.h"
 #include "errors.h"
 #include "file_body.h"
 #include "http_server.h"
-#include "router.h"
+#include "received_body.h"
+#include "request_fields.h"
 
 namespace emulator {
 
@@ -32,7 +34,7 @@ public:
 /** What a connection needs of the server. */
 struct connection_host {
     const server_limits &limits;
-    const request_handler &handler;
+    const request_handlers &handlers;
     std::function<void(open_connection *)> closed;
 };
 
@@ -68,10 +70,12 @@ public:
     }
 
 private:
+    static constexpr std::size_t upload_piece = 64 * 1024; // read in one go
     static constexpr bool is_tls = !std::is_same_v<Stream, beast::tcp_stream>;
     using self_pointer = std::shared_ptr<connection>;
     using header_parser = http::request_parser<http::empty_body>;
     using body_parser = http::request_parser<http::string_body>;
+    using upload_parser = http::request_parser<received_body>;
 
     beast::tcp_stream &socket_layer() { return beast::get_lowest_layer(stream_); }
     void allow(std::chrono::seconds time) { socket_layer().expires_after(time); }
@@ -80,11 +84,13 @@ private:
     void read_header()
     {
         owes_reply_ = false;
+        is_head_ = false;
         if (stopping_)
             return socket_layer().close(); // nothing is unread, so the reply arrives all the same
         header_.emplace();
         header_->header_limit(host_.limits.header_bytes);
-        // Judged when the body is read. ("None" would refuse every body in this version.)
+        // Judged when the body is read, or by its receiver. ("None" would refuse every body in this
+        // version.)
         header_->body_limit(std::numeric_limits<std::uint64_t>::max());
         allow(host_.limits.idle_time);
         http::async_read_header(
@@ -98,23 +104,45 @@ private:
     void header_read()
     {
         allow(host_.limits.exchange_time);
+        const auto &header = header_->get();
+        request asked = request_of(header, origin(header[http::field::host]));
+        if (const auto length = header_->content_length())
+            asked.content_length = *length;
+        is_head_ = asked.method == "HEAD";
+        receiver_ = host_.handlers.receive(asked);
+        receiver_ ? expect_upload() : expect_body();
+    }
+
+    void expect_body()
+    {
         body_.emplace(std::move(*header_));
         body_->body_limit(host_.limits.body_bytes);
         const auto length = body_->content_length();
         if (length && *length > host_.limits.body_bytes)
-            return refuse_and_close(refusal(error::request_too_large));
-        const bool asks_first = beast::iequals(body_->get()[http::field::expect], "100-continue");
-        asks_first ? invite_body() : read_body();
+            return refuse_and_close(refuse(refusal(error::request_too_large)));
+        invited(body_->get(), [this] { read_body(); });
     }
 
-    void invite_body()
+    void expect_upload()
+    {
+        if (receiver_->is_refused())
+            return refuse_upload();
+        upload_.emplace(std::move(*header_), receiver_.get());
+        buffer_.reserve(upload_piece);
+        invited(upload_->get(), [this] { read_upload(); });
+    }
+
+    // Reads what follows the header, once a client that waits to be asked for it has been asked.
+    template <class Message, class Read> void invited(const Message &message, Read read)
     {
         static constexpr char invitation[] = "HTTP/1.1 100 Continue\r\n\r\n";
+        if (!beast::iequals(message[http::field::expect], "100-continue"))
+            return read();
         boost::asio::async_write(
             stream_, boost::asio::buffer(invitation, sizeof invitation - 1),
-            [self = this->shared_from_this()](beast::error_code problem, std::size_t) {
+            [self = this->shared_from_this(), read](beast::error_code problem, std::size_t) {
                 if (!problem)
-                    self->read_body();
+                    read();
             });
     }
 
@@ -126,55 +154,70 @@ private:
                          });
     }
 
+    // Each piece has its own time, as it has when a file is sent.
+    void read_upload()
+    {
+        if (upload_->is_done())
+            return upload_read();
+        allow(host_.limits.exchange_time);
+        http::async_read_some(
+            stream_, buffer_, *upload_,
+            [self = this->shared_from_this()](beast::error_code problem, std::size_t) {
+                if (self->receiver_->is_refused())
+                    return self->refuse_upload();
+                problem ? self->upload_cut(problem) : self->read_upload();
+            });
+    }
+
+    void upload_read()
+    {
+        const bool keep_alive = upload_->get().keep_alive() && !stopping_;
+        const unsigned version = upload_->get().version();
+        upload_.reset();
+        write(std::exchange(receiver_, nullptr)->answer(), version, keep_alive);
+        buffer_.shrink_to_fit();
+    }
+
+    // What came of it goes at once, not when the client has left.
+    void refuse_upload() { refuse_and_close(std::exchange(receiver_, nullptr)->answer()); }
+
+    void upload_cut(beast::error_code problem)
+    {
+        receiver_.reset();
+        read_failed(problem);
+    }
+
     void respond()
     {
         http::request<http::string_body> message = body_->release();
-        const request asked{std::string(message.method_string()),
-                            std::string(message.target()),
-                            std::string(message[http::field::content_type]),
-                            std::move(message.body()),
-                            origin(message[http::field::host]),
-                            std::string(message[http::field::range]),
-                            std::string(message[http::field::if_range])};
-        is_head_ = message.method() == http::verb::head;
-        write(host_.handler(asked), message.version(), message.keep_alive() && !stopping_);
+        request asked = request_of(message, origin(message[http::field::host]));
+        asked.body = std::move(message.body());
+        write(host_.handlers.answer(asked), message.version(), message.keep_alive() && !stopping_);
     }
 
-    // Links lead back to where the client found the server. What is no name of a host is not
-    // repeated into them.
     std::string origin(beast::string_view host)
     {
-        const char *scheme = is_tls ? "https://" : "http://";
-        const bool is_host =
-            !host.empty() && host.find_first_not_of("abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRST"
-                                                    "UVWXYZ0123456789.-:[]") == host.npos;
-        if (is_host)
-            return scheme + std::string(host);
         beast::error_code problem;
         const auto here = socket_layer().socket().local_endpoint(problem);
-        return scheme + std::string("localhost:") + std::to_string(here.port());
+        return origin_of(is_tls ? "https://" : "http://", host, here.port());
     }
 
     // A client that breaks the protocol is told so, if it can still listen, and left.
     void read_failed(beast::error_code problem)
     {
         if (problem == http::error::header_limit || problem == http::error::buffer_overflow)
-            return refuse_and_close(refusal(error::request_too_large, "header"));
+            return refuse_and_close(refuse(refusal(error::request_too_large, "header")));
         if (problem == http::error::body_limit)
-            return refuse_and_close(refusal(error::request_too_large));
+            return refuse_and_close(refuse(refusal(error::request_too_large)));
         const bool is_protocol_fault =
             problem.category() == make_error_code(http::error::bad_method).category();
         if (is_protocol_fault && problem != http::error::end_of_stream &&
             problem != http::error::partial_message)
-            return refuse_and_close(refusal(error::malformed_request, problem.message()));
+            return refuse_and_close(refuse(refusal(error::malformed_request, problem.message())));
         close();
     }
 
-    void refuse_and_close(const refusal &why)
-    {
-        is_head_ = false;
-        write(refuse(why), 11, false);
-    }
+    void refuse_and_close(const reply &refused) { write(refused, 11, false); }
 
     void write(reply made, unsigned version, bool keep_alive)
     {
@@ -276,6 +319,8 @@ private:
     beast::flat_buffer buffer_;
     std::optional<header_parser> header_;
     std::optional<body_parser> body_;
+    std::unique_ptr<body_receiver> receiver_; // of an upload that is under way
+    std::optional<upload_parser> upload_;
     http::response<http::string_body> response_;
     std::optional<http::response<part_of_file>> file_response_;
     std::optional<http::response_serializer<part_of_file>> file_writer_;

@@ -89,6 +89,21 @@ std::string random_bytes(std::size_t count)
 
 std::string random_hex(std::size_t bytes) { return hex(random_bytes(bytes)); }
 
+std::optional<std::string> hex_of_base64(std::string_view text)
+{
+    const std::size_t padding = text.size() - (text.find_last_not_of('=') + 1);
+    // libcrypto would pass over blanks at either end, and knows of padding only that it may be.
+    if (padding > 2 || text.find_first_of(" \t\r\n") != text.npos)
+        return std::nullopt;
+    std::string bytes(text.size() / 4 * 3, '\0');
+    const int decoded =
+        EVP_DecodeBlock(bytes_of(bytes), bytes_of(text), static_cast<int>(text.size()));
+    if (decoded < 0 || static_cast<std::size_t>(decoded) != bytes.size())
+        return std::nullopt;
+    bytes.resize(bytes.size() - padding);
+    return hex(bytes);
+}
+
 bool equal_secrets(std::string_view one, std::string_view other)
 {
     return one.size() == other.size() && CRYPTO_memcmp(one.data(), other.data(), one.size()) == 0;

@@ -3,6 +3,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -35,6 +36,10 @@ private:
 /** Unpredictable bytes, and the same written as lower-case hexadecimal digits, two for a byte. */
 std::string random_bytes(std::size_t count);
 std::string random_hex(std::size_t bytes);
+
+/** The bytes that a base64 text stands for, as lower-case hexadecimal digits; nothing if it stands
+ * for none. */
+std::optional<std::string> hex_of_base64(std::string_view text);
 
 /** Compares without telling by its time where the texts differ. */
 bool equal_secrets(std::string_view one, std::string_view other);

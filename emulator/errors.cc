@@ -35,6 +35,9 @@ const std::vector<error_row> &error_table()
         {error::link_unknown, 404, "Unknown link"},
         {error::range_unsatisfiable, 416, "The file has no such range"},
         {error::edit_impossible, 403, "A file of this type cannot be edited"},
+        {error::revision_outdated, 409, "The file has changed since that revision"},
+        {error::content_mismatch, 400, "The bytes are not those that were announced"},
+        {error::content_present, 409, "The file has content already"},
     };
     return table;
 }

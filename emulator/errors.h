@@ -36,6 +36,9 @@ enum class error {
     link_unknown = 124,
     range_unsatisfiable = 125,
     edit_impossible = 126,
+    revision_outdated = 127,
+    content_mismatch = 128,
+    content_present = 129,
 };
 
 struct error_row {

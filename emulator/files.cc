@@ -2,6 +2,7 @@
 
 #include <cerrno>
 #include <system_error>
+#include <utility>
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -14,6 +15,20 @@ namespace {
 {
     throw std::system_error(errno, std::generic_category(), what);
 }
+
+/** A name that is gone at the end of the scope, unless it has become another by then. */
+class temporary_name {
+public:
+    explicit temporary_name(std::string path) : path_(std::move(path)) {}
+    ~temporary_name() { ::unlink(path_.c_str()); }
+    temporary_name(const temporary_name &) = delete;
+    temporary_name &operator=(const temporary_name &) = delete;
+
+    const std::string &path() const { return path_; }
+
+private:
+    std::string path_;
+};
 
 } // namespace
 
@@ -37,7 +52,8 @@ void write_all(int descriptor, std::string_view text)
 void write_file(const std::filesystem::path &path, std::string_view text, mode_t mode)
 {
     // A temporary name of this process's own: two processes that write the same file both succeed.
-    const std::string temporary = path.string() + "." + std::to_string(::getpid()) + ".new";
+    const temporary_name name(path.string() + "." + std::to_string(::getpid()) + ".new");
+    const std::string &temporary = name.path();
     {
         const descriptor file(
             ::open(temporary.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, mode));

@@ -1,32 +1,21 @@
 #include "form.h"
 
+#include <algorithm>
+#include <optional>
+#include <utility>
+
 #include "errors.h"
 #include "text.h"
 
 namespace emulator {
 namespace {
 
-int hex_digit(char digit)
+// In a form a blank may be written as "+".
+std::string without_plus(std::string_view encoded)
 {
-    if (digit >= '0' && digit <= '9')
-        return digit - '0';
-    if (digit >= 'a' && digit <= 'f')
-        return digit - 'a' + 10;
-    if (digit >= 'A' && digit <= 'F')
-        return digit - 'A' + 10;
-    return -1;
-}
-
-char decode_escape(std::string_view encoded, std::size_t percent)
-{
-    if (percent + 2 >= encoded.size())
-        throw refusal(error::malformed_request, "a percent sign at the end of a parameter");
-    const int high = hex_digit(encoded[percent + 1]);
-    const int low = hex_digit(encoded[percent + 2]);
-    if (high < 0 || low < 0)
-        throw refusal(error::malformed_request,
-                      "a percent sign without two hexadecimal digits in a parameter");
-    return static_cast<char>(high * 16 + low);
+    std::string text(encoded);
+    std::replace(text.begin(), text.end(), '+', ' ');
+    return text;
 }
 
 void add_pair(std::string_view pair, parameters &to)
@@ -42,22 +31,24 @@ void add_pair(std::string_view pair, parameters &to)
 
 } // namespace
 
+split_target split(std::string_view target)
+{
+    const std::size_t mark = target.find('?');
+    if (mark == std::string_view::npos)
+        return {target, {}};
+    return {target.substr(0, mark), target.substr(mark + 1)};
+}
+
 std::string decode_form_text(std::string_view encoded)
 {
-    std::string decoded;
-    decoded.reserve(encoded.size());
-    for (std::size_t at = 0; at < encoded.size(); ++at) {
-        if (encoded[at] == '%') {
-            decoded += decode_escape(encoded, at);
-            at += 2;
-        } else {
-            decoded += encoded[at] == '+' ? ' ' : encoded[at];
-        }
-    }
-    if (!is_xml_text(decoded))
+    std::optional<std::string> decoded = percent_decoded(without_plus(encoded));
+    if (!decoded)
+        throw refusal(error::malformed_request,
+                      "a percent sign without two hexadecimal digits in a parameter");
+    if (!is_xml_text(*decoded))
         throw refusal(error::malformed_request,
                       "a parameter is not UTF-8 or holds a control character");
-    return decoded;
+    return std::move(*decoded);
 }
 
 void add_form_parameters(std::string_view form, parameters &to)

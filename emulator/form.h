@@ -7,6 +7,14 @@
 
 namespace emulator {
 
+/** The target of a request, cut at its first "?". */
+struct split_target {
+    std::string_view path;
+    std::string_view query;
+};
+
+split_target split(std::string_view target);
+
 using parameters = std::map<std::string, std::string>;
 
 /**

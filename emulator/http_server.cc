@@ -72,8 +72,8 @@ std::vector<tcp::acceptor> open_acceptors(asio::io_context &context, std::uint16
 
 class http_server::state : public std::enable_shared_from_this<http_server::state> {
 public:
-    state(asio::io_context &context, const server_limits &limits, request_handler handler)
-        : context_(context), limits_(limits), handler_(std::move(handler))
+    state(asio::io_context &context, const server_limits &limits, request_handlers handlers)
+        : context_(context), limits_(limits), handlers_(std::move(handlers))
     {
     }
 
@@ -158,7 +158,7 @@ private:
     {
         auto closed = [self = shared_from_this()](open_connection *which) { self->closed(which); };
         const auto made = std::make_shared<connection<Stream>>(
-            std::move(stream), connection_host{limits_, handler_, std::move(closed)});
+            std::move(stream), connection_host{limits_, handlers_, std::move(closed)});
         open_.insert(made.get());
         made->start();
     }
@@ -181,7 +181,7 @@ private:
 
     asio::io_context &context_;
     server_limits limits_;
-    request_handler handler_;
+    request_handlers handlers_;
     std::list<listener> listeners_; // a list, because accepting holds on to its element
     std::unordered_set<open_connection *> open_;
     std::function<void()> finished_;
@@ -189,8 +189,8 @@ private:
 };
 
 http_server::http_server(asio::io_context &context, const server_limits &limits,
-                         request_handler handler)
-    : state_(std::make_shared<state>(context, limits, std::move(handler)))
+                         request_handlers handlers)
+    : state_(std::make_shared<state>(context, limits, std::move(handlers)))
 {
 }
 

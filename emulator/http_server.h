@@ -22,13 +22,17 @@ struct server_limits {
     std::chrono::seconds idle_time{60};     // between two requests of one connection
 };
 
-using request_handler = std::function<reply(const request &)>;
+struct request_handlers {
+    std::function<reply(const request &)> answer;
+    /** Asked first, with the header alone; null when the body is to be read into the request. */
+    std::function<std::unique_ptr<body_receiver>(const request &)> receive;
+};
 
-/** Serves on one thread, the one that runs the context: the handler is never run twice at once. */
+/** Serves on one thread, the one that runs the context: no handler is run twice at once. */
 class http_server {
 public:
     http_server(boost::asio::io_context &context, const server_limits &limits,
-                request_handler handler);
+                request_handlers handlers);
     ~http_server();
 
     /**

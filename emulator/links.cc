@@ -1,9 +1,9 @@
 #include "links.h"
 
 #include "byte_range.h"
+#include "envelope.h"
 #include "errors.h"
 #include "media_types.h"
-#include "router.h"
 #include "store/content.h"
 #include "store/database.h"
 #include "store/one_time_links.h"

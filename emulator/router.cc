@@ -1,30 +1,15 @@
 #include "router.h"
 
 #include <algorithm>
-#include <iostream>
 
+#include "caller.h"
 #include "endpoints/endpoints.h"
+#include "envelope.h"
 #include "links.h"
 #include "store/database.h"
-#include "store/sessions.h"
 
 namespace emulator {
 namespace {
-
-constexpr const char *current_api_version = "2.13";
-
-struct split_target {
-    std::string_view path;
-    std::string_view query;
-};
-
-split_target split(std::string_view target)
-{
-    const std::size_t mark = target.find('?');
-    if (mark == std::string_view::npos)
-        return {target, {}};
-    return {target.substr(0, mark), target.substr(mark + 1)};
-}
 
 const endpoint *find_endpoint(std::string_view path)
 {
@@ -65,47 +50,6 @@ parameters parameters_of(const request &asked, std::string_view query)
     return given;
 }
 
-std::int64_t account_of_session(const parameters &given, session_need need, service &state)
-{
-    if (need == session_need::none)
-        return 0;
-    const auto token = given.find("session_token");
-    const bool is_given = token != given.end() && !token->second.empty();
-    if (!is_given && need == session_need::optional)
-        return 0;
-    if (!is_given)
-        throw refusal(error::session_invalid);
-    const auto account =
-        use_session(state.store, token->second, {state.now(), state.session_lifetime});
-    if (!account)
-        throw refusal(error::session_invalid);
-    return *account;
-}
-
-void begin_envelope(xml_writer &xml, const endpoint *target)
-{
-    xml.open("response");
-    if (target)
-        xml.element("action", action_of(*target));
-}
-
-std::string end_envelope(xml_writer &xml, const char *result)
-{
-    xml.element("result", result);
-    xml.element("current_api_version", current_api_version);
-    xml.close();
-    return xml.take();
-}
-
-reply error_reply(const endpoint *target, error number, std::string_view message)
-{
-    xml_writer xml;
-    begin_envelope(xml, target);
-    xml.element("message", message);
-    xml.element("error", static_cast<std::uint64_t>(number));
-    return {row_of(number).http_status, end_envelope(xml, "Error")};
-}
-
 void handle(const endpoint &target, const call &made, xml_writer &xml)
 {
     if (target.use == store_use::own)
@@ -121,7 +65,7 @@ reply run(const request &asked, std::string_view query, const endpoint &target, 
     const parameters given = parameters_of(asked, query);
     const call made{state, given, account_of_session(given, target.session, state), asked.origin};
     xml_writer xml;
-    begin_envelope(xml, &target);
+    begin_envelope(xml, action_of(target));
     handle(target, made, xml);
     return {200, end_envelope(xml, "Success")};
 }
@@ -174,23 +118,18 @@ reply answer(const request &asked, service &state)
 {
     const split_target parts = split(asked.target);
     const endpoint *target = find_endpoint(parts.path);
-    try {
-        if (const link_kind *kind = link_kind_of(parts.path))
-            return serve_link(asked, *kind, state);
-        if (!target)
+    const std::string_view action = target ? action_of(*target) : std::string_view();
+    reply made{};
+    const auto refused = refusal_of(parts.path, action, [&] {
+        const link_kind *kind = link_kind_of(parts.path);
+        if (!kind && !target)
             throw refusal(error::unknown_endpoint);
-        check_method(asked.method);
-        return run(asked, parts.query, *target, state);
-    } catch (const refusal &why) {
-        return error_reply(target, why.number(), why.what());
-    } catch (const std::exception &problem) {
-        // The client learns that it is not at fault, and no more than that.
-        std::cerr << "quillmere-emulator: " << parts.path << ": " << problem.what() << std::endl;
-        return error_reply(target, error::internal, row_of(error::internal).message);
-    }
+        if (!kind)
+            check_method(asked.method);
+        made = kind ? serve_link(asked, *kind, state) : run(asked, parts.query, *target, state);
+    });
+    return refused ? *refused : made;
 }
-
-reply refuse(const refusal &why) { return error_reply(nullptr, why.number(), why.what()); }
 
 const std::string &call::required(const char *name) const
 {

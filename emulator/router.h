@@ -1,16 +1,13 @@
 // From a request to a reply: finds the endpoint, checks the session, wraps the answer.
 #pragma once
 
-#include <string_view>
 #include <vector>
 
-#include "errors.h"
+#include "caller.h"
 #include "service.h"
 #include "xml_writer.h"
 
 namespace emulator {
-
-enum class session_need { none, optional, required };
 
 /** The transaction around a handler: its own affair, one that sees one state of the store, or one
  * that makes all of its changes or none. */
@@ -28,8 +25,5 @@ const std::vector<endpoint> &endpoint_table();
 
 /** Serves a request. Whatever happens, the reply is an envelope. */
 reply answer(const request &asked, service &state);
-
-/** The envelope of a failure that came before any endpoint was known. */
-reply refuse(const refusal &why);
 
 } // namespace emulator

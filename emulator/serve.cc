@@ -13,6 +13,7 @@
 #include "router.h"
 #include "store/content.h"
 #include "store/database.h"
+#include "uploads.h"
 
 namespace emulator {
 namespace {
@@ -54,7 +55,8 @@ void serve(const serve_settings &settings)
 
     asio::io_context context(1);
     http_server server(context, {},
-                       [&state](const request &asked) { return answer(asked, state); });
+                       {[&state](const request &asked) { return answer(asked, state); },
+                        [&state](const request &asked) { return receive_upload(asked, state); }});
     asio::signal_set signals(context, SIGINT, SIGTERM);
     asio::steady_timer farewell(context);
     signals.async_wait([&](const boost::system::error_code &, int) {

@@ -6,6 +6,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "files.h"
@@ -24,7 +25,7 @@ struct service {
     std::int64_t session_lifetime;     // seconds
 };
 
-/** A request as it arrived, its body whole. */
+/** A request as it arrived, its body whole, or handed to a receiver. */
 struct request {
     std::string method;
     std::string target;
@@ -33,6 +34,10 @@ struct request {
     std::string origin = {}; // "https://localhost:4711", as the client addressed the server
     std::string range = {};  // the header fields of these names
     std::string if_range = {};
+    std::string content_disposition = {};
+    std::string content_digest = {};
+    std::string repr_digest = {};
+    std::optional<std::uint64_t> content_length = {}; // unknown of a body in chunks
 };
 
 /** Bytes of a file that are sent as they are. */
@@ -53,6 +58,18 @@ struct reply {
     std::string body;
     std::optional<file_part> file = {};    // in place of the body
     std::vector<header_field> fields = {}; // beside the usual ones, or in place of them
+};
+
+/** Takes the body of one request while it arrives. Nothing is thrown: what goes wrong is answered.
+ */
+class body_receiver {
+public:
+    virtual ~body_receiver() = default;
+    virtual void take(std::string_view piece) = 0;
+    /** Whether the answer is certain, so that the rest of the body is of no use. */
+    virtual bool is_refused() const = 0;
+    /** What is sent back, once the body is whole or was refused. */
+    virtual reply answer() = 0;
 };
 
 /** One request on its way to an endpoint. */

@@ -58,6 +58,17 @@ bool is_xml_character(std::uint32_t code_point)
     return code_point != 0xFFFE && code_point != 0xFFFF && code_point <= 0x10FFFF;
 }
 
+int hex_digit(char digit)
+{
+    if (digit >= '0' && digit <= '9')
+        return digit - '0';
+    if (digit >= 'a' && digit <= 'f')
+        return digit - 'a' + 10;
+    if (digit >= 'A' && digit <= 'F')
+        return digit - 'A' + 10;
+    return -1;
+}
+
 } // namespace
 
 bool is_xml_text(std::string_view text)
@@ -69,6 +80,25 @@ bool is_xml_text(std::string_view text)
         text.remove_prefix(next.length);
     }
     return true;
+}
+
+std::optional<std::string> percent_decoded(std::string_view encoded)
+{
+    std::string decoded;
+    decoded.reserve(encoded.size());
+    for (std::size_t at = 0; at < encoded.size(); ++at) {
+        if (encoded[at] != '%') {
+            decoded += encoded[at];
+            continue;
+        }
+        const int high = at + 2 < encoded.size() ? hex_digit(encoded[at + 1]) : -1;
+        const int low = at + 2 < encoded.size() ? hex_digit(encoded[at + 2]) : -1;
+        if (high < 0 || low < 0)
+            return std::nullopt;
+        decoded += static_cast<char>(high * 16 + low);
+        at += 2;
+    }
+    return decoded;
 }
 
 std::optional<std::uint64_t> parse_decimal(std::string_view text, std::uint64_t largest)

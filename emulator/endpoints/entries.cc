@@ -111,9 +111,9 @@ folder own_folder(const call &asked, const char *parameter)
     return found;
 }
 
-file own_file(const call &asked)
+file own_file(const call &asked, const char *parameter)
 {
-    file found = living(any_file(asked, asked.required("quick_key")), error::file_unknown);
+    file found = living(any_file(asked, asked.required(parameter)), error::file_unknown);
     check_owner(asked, found);
     return found;
 }

@@ -21,7 +21,7 @@ file copyable_file(const call &asked);
 
 /** One of the account's own, to change it, and no root. */
 folder own_folder(const call &asked, const char *parameter);
-file own_file(const call &asked);
+file own_file(const call &asked, const char *parameter);
 
 /** One of the account's own, to put something in; without a key its root. */
 folder destination_folder(const call &asked, const char *parameter);

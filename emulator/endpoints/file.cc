@@ -51,12 +51,12 @@ void create_file(const call &asked, xml_writer &xml)
 
 void delete_file(const call &asked, xml_writer &)
 {
-    delete_file(asked.state.store, own_file(asked), asked.state.now());
+    delete_file(asked.state.store, own_file(asked, "quick_key"), asked.state.now());
 }
 
 void update_file(const call &asked, xml_writer &)
 {
-    const file target = own_file(asked);
+    const file target = own_file(asked, "quick_key");
     update_file(asked.state.store, target, change_given(asked, "filename"));
 }
 
@@ -70,7 +70,7 @@ void copy_file(const call &asked, xml_writer &xml)
 
 void move_file(const call &asked, xml_writer &)
 {
-    const file source = own_file(asked);
+    const file source = own_file(asked, "quick_key");
     move_file(asked.state.store, source, destination_folder(asked, "folder_key"));
 }
 

@@ -11,8 +11,6 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "digest.h"
-
 namespace emulator {
 namespace {
 
@@ -46,37 +44,11 @@ void make_folder(const std::filesystem::path &folder)
         fail(folder.string());
 }
 
-/** A file under a name of its own until it is whole. What a killed process leaves of it is no
- * content, and goes with the next clearing. */
-class temporary_file {
-public:
-    explicit temporary_file(const std::filesystem::path &folder)
-        : path_(folder / ("new-" + random_hex(16))),
-          file_(::open(path_.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, S_IRUSR | S_IWUSR))
-    {
-        if (file_.number() < 0)
-            fail(path_.string());
-    }
-    ~temporary_file() { ::unlink(path_.c_str()); } // fails, as it should, once it is renamed
-    temporary_file(const temporary_file &) = delete;
-    temporary_file &operator=(const temporary_file &) = delete;
-
-    int number() const { return file_.number(); }
-
-    /** Puts it in place, whole or not at all. It may replace the same bytes: one name, one
-     * content. */
-    void rename_to(const std::filesystem::path &path)
-    {
-        flush(file_.number(), path_.string());
-        if (::rename(path_.c_str(), path.c_str()) != 0)
-            fail(path.string());
-        flush_folder(path.parent_path());
-    }
-
-private:
-    std::filesystem::path path_;
-    descriptor file_;
-};
+// A level of folders keeps each of them small.
+std::filesystem::path path_of(const std::filesystem::path &folder, const std::string &hash)
+{
+    return folder / hash.substr(0, 2) / hash;
+}
 
 std::size_t read_piece(int from, std::array<char, piece_bytes> &piece)
 {
@@ -91,33 +63,70 @@ std::size_t read_piece(int from, std::array<char, piece_bytes> &piece)
 
 } // namespace
 
+// What a killed process leaves under this name is no content, and goes with the next clearing.
+incoming_content::incoming_content(const std::filesystem::path &folder)
+    : folder_(folder), path_(folder / ("new-" + random_hex(16))),
+      file_(::open(path_.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, S_IRUSR | S_IWUSR))
+{
+    if (file_.number() < 0)
+        fail(path_.string());
+}
+
+incoming_content::~incoming_content()
+{
+    ::unlink(path_.c_str()); // fails, as it should, once it is renamed
+}
+
+void incoming_content::add(std::string_view piece)
+{
+    sum_.add(piece);
+    write_all(file_.number(), piece);
+    size_ += piece.size();
+}
+
+content_id incoming_content::finish()
+{
+    flush(file_.number(), path_.string());
+    return {sum_.finish_hex(), size_};
+}
+
+// It may replace the same bytes: one name, one content.
+void incoming_content::keep(const content_id &finished)
+{
+    const std::filesystem::path place = path_of(folder_, finished.hash);
+    make_folder(place.parent_path());
+    if (::rename(path_.c_str(), place.c_str()) != 0)
+        fail(place.string());
+    flush_folder(place.parent_path());
+}
+
 content_store::content_store(std::filesystem::path directory) : directory_(std::move(directory))
 {
     make_folder(directory_);
 }
 
-content_id content_store::keep(int from, std::uint64_t largest)
+std::unique_ptr<incoming_content> content_store::receive() const
 {
-    temporary_file made(directory_);
-    sha256_sum sum;
-    content_id kept;
+    return std::make_unique<incoming_content>(directory_);
+}
+
+content_id content_store::keep(int from, std::uint64_t largest) const
+{
+    incoming_content incoming(directory_);
     std::array<char, piece_bytes> piece;
     while (const std::size_t got = read_piece(from, piece)) {
-        kept.size += got;
-        if (kept.size > largest)
+        incoming.add({piece.data(), got});
+        if (incoming.size() > largest)
             throw std::runtime_error("more than " + std::to_string(largest) + " bytes");
-        sum.add({piece.data(), got});
-        write_all(made.number(), {piece.data(), got});
     }
-    kept.hash = sum.finish_hex();
-    make_folder(path_of(kept.hash).parent_path());
-    made.rename_to(path_of(kept.hash));
-    return kept;
+    content_id finished = incoming.finish();
+    incoming.keep(finished);
+    return finished;
 }
 
 descriptor content_store::open(const content_id &content) const
 {
-    const std::filesystem::path path = path_of(content.hash);
+    const std::filesystem::path path = path_of(directory_, content.hash);
     descriptor opened(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
     if (opened.number() < 0)
         fail(path.string());
@@ -126,7 +135,7 @@ descriptor content_store::open(const content_id &content) const
 
 bool content_store::holds(const content_id &content) const
 {
-    return ::access(path_of(content.hash).c_str(), F_OK) == 0;
+    return ::access(path_of(directory_, content.hash).c_str(), F_OK) == 0;
 }
 
 void content_store::keep_only(const std::set<std::string> &hashes)
@@ -137,12 +146,6 @@ void content_store::keep_only(const std::set<std::string> &hashes)
             unused.push_back(each.path());
     for (const std::filesystem::path &each : unused)
         std::filesystem::remove(each);
-}
-
-// A level of folders keeps each of them small.
-std::filesystem::path content_store::path_of(const std::string &hash) const
-{
-    return directory_ / hash.substr(0, 2) / hash;
 }
 
 } // namespace emulator
