@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <vector>
 
 namespace quillmere::tools {
 
@@ -31,14 +32,80 @@ struct login_arguments {
     bool password_from_stdin = false;
 };
 
+struct login_token_arguments {
+    login_arguments login;
+    std::string token_file;
+};
+
 struct device_status_arguments {
     std::uint32_t device_id = 0;
+};
+
+/** Of the commands that take one entry. */
+struct entry_arguments {
+    std::string path = "/";
+    std::optional<std::string> time; ///< of what is created
+    bool long_form = false;          ///< of a listing
+    bool parents = false;            ///< folders that are missing on the way are created too
+    bool recursive = false;          ///< a folder, with all that it holds
+};
+
+/** Of mv and cp. */
+struct transfer_arguments {
+    std::string source;
+    std::string destination;
+    bool recursive = false;
+};
+
+/** Of put and get. */
+struct put_arguments {
+    std::vector<std::string> words; ///< sources, and behind them the destination
+    bool recursive = false;
+    bool quiet = false;
+};
+using get_arguments = put_arguments;
+
+struct update_arguments {
+    std::string source;
+    std::string path;
+    bool quiet = false;
+};
+
+struct set_arguments {
+    std::string path;
+    std::optional<std::string> name;
+    std::optional<std::string> description;
+    std::optional<std::string> tags;
+    std::optional<std::string> privacy;
+    std::optional<std::string> time;
+    bool recursive = false;
+};
+
+struct links_arguments {
+    std::string path;
+    std::string type;
+    bool download = false;
+};
+
+struct changes_arguments {
+    std::string since = "0"; ///< a decimal number
+    std::uint32_t device_id = 0;
+    bool sample = false;
 };
 
 struct arguments {
     common_arguments common;
     login_arguments login;
+    login_token_arguments login_token;
     device_status_arguments device_status;
+    entry_arguments entry;
+    transfer_arguments transfer;
+    put_arguments put;
+    get_arguments get;
+    update_arguments update;
+    set_arguments set;
+    links_arguments links;
+    changes_arguments changes;
 };
 
 } // namespace quillmere::tools

@@ -14,27 +14,58 @@ namespace {
 constexpr std::size_t body_kept = 2048;
 constexpr std::size_t line_kept = 1024;
 constexpr std::string_view error_beginning = "cUrl error: (";
+constexpr int timed_out = 28; // of libcurl
+
+std::optional<int> take_code(std::string_view &line)
+{
+    int code = 0;
+    const auto [end, problem] = std::from_chars(line.data(), line.data() + line.size(), code);
+    if (problem != std::errc())
+        return std::nullopt;
+    line.remove_prefix(static_cast<std::size_t>(end - line.data()));
+    return code;
+}
 
 // "cUrl error: (code) general reason: particular reason", where the last may be empty.
-std::optional<transfer_error> read_error(std::string_view line)
+std::optional<transfer_error> read_exchange_error(std::string_view line)
 {
     if (!starts_with(line, error_beginning))
         return std::nullopt;
     line.remove_prefix(error_beginning.size());
-    transfer_error error;
-    const auto [end, problem] = std::from_chars(line.data(), line.data() + line.size(), error.code);
-    if (problem != std::errc())
-        return std::nullopt;
-
-    line.remove_prefix(static_cast<std::size_t>(end - line.data()));
-    if (!starts_with(line, ") "))
+    const auto code = take_code(line);
+    if (!code || !starts_with(line, ") "))
         return std::nullopt;
     line.remove_prefix(2);
     const std::size_t colon = line.find(": ");
     const std::string_view particular =
         colon == std::string_view::npos ? std::string_view() : trimmed(line.substr(colon + 2));
-    error.text = particular.empty() ? line.substr(0, colon) : particular;
-    return error;
+    return transfer_error{*code,
+                          std::string(particular.empty() ? line.substr(0, colon) : particular)};
+}
+
+// "Curl error: reason" when connecting fails, "Error: code reason" when sending or receiving does,
+// "Error: ... timeout." when nothing moves; other lines that begin so are no failures.
+std::optional<transfer_error> read_upload_error(std::string_view line)
+{
+    constexpr std::string_view connecting = "Curl error: ";
+    constexpr std::string_view moving = "Error: ";
+    if (starts_with(line, connecting))
+        return transfer_error{0, std::string(line.substr(connecting.size()))};
+    if (!starts_with(line, moving))
+        return std::nullopt;
+    line.remove_prefix(moving.size());
+    if (ends_with(line, "timeout."))
+        return transfer_error{timed_out, "nothing moved for 60 seconds"};
+    const auto code = take_code(line);
+    if (!code)
+        return std::nullopt;
+    return transfer_error{*code, std::string(trimmed(line))};
+}
+
+std::optional<transfer_error> read_error(std::string_view line)
+{
+    const auto error = read_exchange_error(line);
+    return error ? error : read_upload_error(line);
 }
 
 // Skips blanks, and what may stand before the first element of an XHTML page.

@@ -43,6 +43,19 @@ failure file_failure(const std::string &what, int error_number, std::string advi
                    what + ": " + std::generic_category().message(error_number), std::move(advice));
 }
 
+void after(const std::string &done, const std::function<void()> &step)
+{
+    try {
+        step();
+    } catch (failure &problem) {
+        if (!done.empty()) {
+            problem.code = exit_code::partly_done;
+            problem.why = done + ", but " + problem.why;
+        }
+        throw;
+    }
+}
+
 std::string line_of(const failure &problem)
 {
     std::string line = "quillmere: " + escape_controls(problem.why);

@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <exception>
+#include <functional>
 #include <optional>
 #include <string>
 
@@ -42,6 +43,14 @@ struct failure : std::exception {
 
 /** A failure of a call on a local file, told with the reason that errno gives. */
 failure file_failure(const std::string &what, int error_number, std::string advice = {});
+
+/**
+ * Takes a step that follows others. When it fails, the failure tells what is done already, and is
+ * one of a job that is partly done.
+ *
+ * @param done what the steps before did ("created photos"), or empty when there were none
+ */
+void after(const std::string &done, const std::function<void()> &step);
 
 /** The whole message on one line: "quillmere: why (advice)". Control characters are escaped. */
 std::string line_of(const failure &problem);

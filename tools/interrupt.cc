@@ -13,6 +13,17 @@ termios shown_settings;
 int hidden_terminal = -1;
 volatile std::sig_atomic_t echo_is_hidden = 0;
 
+volatile std::sig_atomic_t line_is_open = 0;
+
+void end_open_line()
+{
+    if (line_is_open == 0)
+        return;
+    line_is_open = 0;
+    // What cannot be written to a terminal that is gone is not missed either.
+    static_cast<void>(::write(STDERR_FILENO, "\n", 1) == 1);
+}
+
 void restore_echo()
 {
     if (echo_is_hidden == 0)
@@ -27,6 +38,7 @@ extern "C" {
 static void stop_for_user(int)
 {
     restore_echo();
+    end_open_line();
     ::_exit(static_cast<int>(exit_code::interrupted));
 }
 
@@ -34,6 +46,7 @@ static void stop_for_user(int)
 static void stop_for_system(int signal_number)
 {
     restore_echo();
+    end_open_line();
     ::raise(signal_number);
 }
 }
@@ -61,6 +74,8 @@ void handle_interrupts()
     install(SIGHUP, stop_for_system, static_cast<int>(SA_RESETHAND));
     install(SIGPIPE, SIG_IGN, 0);
 }
+
+void mark_open_line(bool open) { line_is_open = open ? 1 : 0; }
 
 echo_pause::echo_pause(int terminal, bool wanted)
 {

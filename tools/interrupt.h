@@ -15,6 +15,10 @@ namespace quillmere::tools {
  */
 void handle_interrupts();
 
+/** Whether the terminal's cursor stands behind a line that is not ended. A signal that ends the
+ * process ends the line first, so that what comes next does not stand in it. */
+void mark_open_line(bool open);
+
 /** Keeps what is typed at a terminal from being shown, until it is destroyed or a signal comes. */
 class echo_pause {
 public:

@@ -92,18 +92,24 @@ void masking_filter::take_name_letter(char letter)
 
 void masking_filter::end_name(char letter, std::string &passed)
 {
-    const bool secret = is_secret_name(name_);
-    if (secret && letter == '=') {
+    if (letter == '=' && is_secret_name(name_))
         place_ = place::value_start;
-    } else if (secret && name_opens_tag_ && (letter == '>' || is_blank_or_control(letter))) {
-        closing_ = "</" + lower_case(name_);
-        last_in_tag_ = 0;
-        place_ = place::secret_tag;
-        if (letter == '>')
-            enter_element(passed);
-    }
+    else
+        end_tag_name(letter, passed);
     name_.clear();
     name_opens_tag_ = letter == '<';
+}
+
+void masking_filter::end_tag_name(char letter, std::string &passed)
+{
+    const bool ends = letter == '>' || is_blank_or_control(letter);
+    if (!ends || !name_opens_tag_ || !is_secret_name(name_))
+        return;
+    closing_ = "</" + lower_case(name_);
+    last_in_tag_ = 0;
+    place_ = place::secret_tag;
+    if (letter == '>')
+        enter_element(passed);
 }
 
 void masking_filter::enter_element(std::string &passed)
@@ -133,6 +139,7 @@ void masking_filter::feed_value_start(char letter, std::string &passed)
         passed += letter;
         passed += mask;
         quote_ = letter;
+        named_in_quotes_ = false;
         place_ = place::quoted_value;
         return;
     }
@@ -150,12 +157,23 @@ void masking_filter::feed_value(char letter, std::string &passed)
     feed_text(letter, passed);
 }
 
+// The value may be cut off, and other secrets follow. So a quotation mark behind a secret's name
+// opens rather than closes, and the tag of a secret element counts here too.
 void masking_filter::feed_quoted_value(char letter, std::string &passed)
 {
-    if (letter != quote_)
+    if (is_name_letter(letter)) {
+        named_in_quotes_ = false;
+        take_name_letter(letter);
         return;
-    place_ = place::text;
-    passed += letter;
+    }
+    if (letter == quote_ && !named_in_quotes_) {
+        place_ = place::text;
+        passed += letter;
+    }
+    named_in_quotes_ = letter == '=' && is_secret_name(name_);
+    end_tag_name(letter, passed);
+    name_.clear();
+    name_opens_tag_ = letter == '<';
 }
 
 // Only the element's own end tag ends it: not a child's, nor a "<" in a CDATA section. A reply that

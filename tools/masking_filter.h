@@ -30,6 +30,7 @@ private:
     void feed_element(char letter, std::string &passed);
     void take_name_letter(char letter);
     void end_name(char letter, std::string &passed);
+    void end_tag_name(char letter, std::string &passed);
     void enter_element(std::string &passed);
 
     place place_ = place::text;
@@ -37,6 +38,7 @@ private:
     std::string closing_;           // "</" and the name of the secret element, in lower case
     bool name_opens_tag_ = false;   // a "<" stands before the name
     char quote_ = 0;                // closes the quoted value
+    bool named_in_quotes_ = false;  // a secret's name and "=" end the quoted value so far
     char last_in_tag_ = 0;          // tells "<name/>" from "<name>"
     std::size_t closing_match_ = 0; // how much of closing_ the element's text ends with
 };

@@ -141,6 +141,13 @@ void write_private_file(const std::string &path, const std::string &text, const 
     sync_directory(directory);
 }
 
+void create_private_file(const std::string &path, const std::string &text, const std::string &what)
+{
+    const descriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+    if (!file || !write_all(file.number(), text))
+        throw file_failure("cannot write " + what + " " + path, errno);
+}
+
 bool remove_file(const std::string &path, const std::string &what)
 {
     if (::unlink(path.c_str()) == 0)

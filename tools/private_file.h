@@ -33,6 +33,10 @@ std::optional<private_text> read_private_file(const std::string &path, const std
  */
 void write_private_file(const std::string &path, const std::string &text, const std::string &what);
 
+/** Makes a new file with mode 0600, in a directory that is there; a failure when there is a file of
+ * that name already. */
+void create_private_file(const std::string &path, const std::string &text, const std::string &what);
+
 /** Removes a file; false when there was none. */
 bool remove_file(const std::string &path, const std::string &what);
 

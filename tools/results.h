@@ -14,8 +14,27 @@ namespace quillmere::tools {
 /** One thing that a command found out. */
 struct fact {
     const char *key;              ///< its name in JSON
-    const char *label;            ///< its name for people
+    const char *label;            ///< its name for people, or null: told to scripts alone
     nlohmann::ordered_json value; ///< a text, a number, a truth value or null
+};
+
+/** Facts that scripts find in an object of their own. */
+struct fact_group {
+    const char *key;
+    std::vector<fact> facts;
+};
+
+/** A column of a table for people: the fact of each row that has this key. */
+struct column {
+    const char *key;
+    const char *label;
+};
+
+/** Many things of a kind. Scripts get all facts of each, people those that have a column. */
+struct result_table {
+    const char *key; ///< the name of the rows in JSON
+    std::vector<column> columns;
+    std::vector<std::vector<fact>> rows;
 };
 
 enum class result_format { text, json };
@@ -26,6 +45,18 @@ std::string facts_as_text(const std::vector<fact> &facts, bool for_terminal);
 /** The facts as one JSON object. */
 std::string facts_as_json(const std::vector<fact> &facts);
 
+/** The groups as lines of label and value, without those that nothing is known of. */
+std::string groups_as_text(const std::vector<fact_group> &groups, bool for_terminal);
+
+/** The groups as an object of objects. */
+std::string groups_as_json(const std::vector<fact_group> &groups);
+
+/** The rows below a line of headings, numbers to the right; nothing for no rows. */
+std::string table_as_text(const result_table &shown, bool for_terminal);
+
+/** An object of the facts that are told about the whole, and an array of the rows. */
+std::string table_as_json(const std::vector<fact> &about, const result_table &shown);
+
 class results {
 public:
     /** Takes standard output for itself: what others write to descriptor 1 is lost from now on. */
@@ -35,6 +66,13 @@ public:
     result_format format() const { return format_; }
 
     void facts(const std::vector<fact> &facts);
+    void groups(const std::vector<fact_group> &groups);
+
+    /** What is told about the whole stands above the rows. */
+    void rows(const std::vector<fact> &about, const result_table &shown);
+
+    /** Lines for people; the rows for scripts. */
+    void lines(const std::vector<std::string> &lines, const result_table &shown);
 
     /** A sentence for people; its facts for scripts. */
     void sentence(const std::string &sentence, const std::vector<fact> &facts);

@@ -28,6 +28,12 @@ std::string_view port_of(std::string_view host_and_port)
     return host_and_port.substr(colon + 1);
 }
 
+std::string_view port_of_base(const std::string &secure_base)
+{
+    const std::string_view rest = std::string_view(secure_base).substr(https.size());
+    return port_of(rest.substr(0, rest.find('/')));
+}
+
 } // namespace
 
 std::string normal_base_address(const std::string &address, const std::string &source)
@@ -48,19 +54,26 @@ std::string normal_base_address(const std::string &address, const std::string &s
 
 service_addresses addresses_of(const std::string &secure_base, const std::string &plain_base)
 {
-    return {plain_base, secure_base, plain_base + upload_path, secure_base + upload_path};
+    return {plain_base, secure_base, upload_address_on(plain_base), upload_address_on(secure_base)};
+}
+
+std::string upload_address_on(const std::string &base) { return base + upload_path; }
+
+bool is_on_standard_port(const std::string &secure_base)
+{
+    const std::string_view port = port_of_base(secure_base);
+    return port.empty() || port == "443";
 }
 
 std::string plain_base_of(const std::string &secure_base)
 {
     const std::string_view rest = std::string_view(secure_base).substr(https.size());
-    const std::string_view port = port_of(rest.substr(0, rest.find('/')));
-    if (!port.empty() && port != "443")
+    if (!is_on_standard_port(secure_base))
         throw failure(exit_code::usage,
                       "--plain-http cannot tell the unencrypted address of " + secure_base,
                       "it works with a service on the standard ports, or with --emulator");
     std::string plain = "http://" + std::string(rest);
-    if (port == "443")
+    if (!port_of_base(secure_base).empty())
         plain.erase(plain.find(":443", https.size() - 1), 4);
     return plain;
 }

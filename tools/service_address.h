@@ -23,6 +23,12 @@ std::string normal_base_address(const std::string &address, const std::string &s
 /** The four addresses; the library's plain ones are those of plain_base. */
 service_addresses addresses_of(const std::string &secure_base, const std::string &plain_base);
 
+/** Where files are uploaded to on a base. */
+std::string upload_address_on(const std::string &base);
+
+/** Whether a secure base is on port 443. */
+bool is_on_standard_port(const std::string &secure_base);
+
 /**
  * The unencrypted base that goes with a secure one on the standard ports; a usage failure for one
  * with a port of its own, which cannot be asked where its unencrypted neighbour is.

@@ -104,6 +104,9 @@ settings decide_settings(const common_arguments &given, const setting_sources &s
     settings decided;
     decided.addresses = addresses_of(service.base, choose_plain_base(given, service));
     decided.emulator = service.emulator;
+    // Where else uploads could not reach it: they take TLS on the standard port alone.
+    if (service.emulator)
+        decided.addresses.plain_upload = upload_address_on(service.emulator->plain_base);
     if (!given.insecure)
         decided.ca = choose_bundle(given, sources, service);
     const profile &chosen = sources.chosen_profile;

@@ -1,7 +1,6 @@
 #include "text.h"
 
 #include <charconv>
-#include <cstdint>
 #include <cstdio>
 
 #include <nlohmann/json.hpp>
@@ -113,17 +112,29 @@ std::string json_line(const nlohmann::ordered_json &document)
     return document.dump(2, ' ', true, nlohmann::ordered_json::error_handler_t::replace) + "\n";
 }
 
+std::optional<std::uint64_t> decimal_number(std::string_view text)
+{
+    std::uint64_t number = 0;
+    const char *const end = text.data() + text.size();
+    const auto [stop, error] = std::from_chars(text.data(), end, number);
+    const bool padded = text.size() > 1 && text[0] == '0';
+    if (error != std::errc() || stop != end || padded)
+        return std::nullopt;
+    return number;
+}
+
 nlohmann::ordered_json number_or_text(const char *text)
 {
     if (text == nullptr)
         return nullptr;
-    const std::string_view digits = text;
-    std::uint64_t number = 0;
-    const auto [end, error] = std::from_chars(digits.data(), digits.data() + digits.size(), number);
-    const bool padded = digits.size() > 1 && digits[0] == '0';
-    if (error == std::errc() && end == digits.data() + digits.size() && !padded)
-        return number;
+    if (const auto number = decimal_number(text))
+        return *number;
     return text;
+}
+
+nlohmann::ordered_json text_or_null(const char *text)
+{
+    return text == nullptr ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
 }
 
 std::string lower_case(std::string_view text)

@@ -1,6 +1,8 @@
 // Text that comes from outside, made fit for one line, for a terminal, or for JSON.
 #pragma once
 
+#include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -22,8 +24,14 @@ std::size_t columns(std::string_view text);
  * a terminal finds no control characters in it. */
 std::string json_line(const nlohmann::ordered_json &document);
 
+/** The number that a text is in decimal digits, without any that it could do without. */
+std::optional<std::uint64_t> decimal_number(std::string_view text);
+
 /** What the service sent as a text: a number if it is one in decimal, null if it is NULL. */
 nlohmann::ordered_json number_or_text(const char *text);
+
+/** What the service sent as a text: null if it is NULL. */
+nlohmann::ordered_json text_or_null(const char *text);
 
 /** ASCII only, whatever the locale. */
 std::string lower_case(std::string_view text);
