@@ -3,14 +3,19 @@
 
 include(GoogleTest)
 
-# quillmere_test(name SOURCES file... LIBRARIES target...)
+# quillmere_test(name SOURCES file... LIBRARIES target... [TIMEOUT seconds])
 function(quillmere_test name)
-    cmake_parse_arguments(PARSE_ARGV 1 test "" "" "SOURCES;LIBRARIES")
+    cmake_parse_arguments(PARSE_ARGV 1 test "" "TIMEOUT" "SOURCES;LIBRARIES")
+    if(NOT test_TIMEOUT)
+        set(test_TIMEOUT 120)
+    endif()
     add_executable(${name} ${test_SOURCES})
     target_link_libraries(${name}
         PRIVATE ${test_LIBRARIES} GTest::gtest_main quillmere_compiler_options)
+    quillmere_precompile(${name} gmock/gmock.h gtest/gtest.h)
     # Cases go by their numbers: a printed value may hold an address, which differs from one build to the next.
-    gtest_discover_tests(${name} NO_PRETTY_TYPES NO_PRETTY_VALUES DISCOVERY_TIMEOUT 60 PROPERTIES TIMEOUT 120)
+    gtest_discover_tests(${name} NO_PRETTY_TYPES NO_PRETTY_VALUES
+        DISCOVERY_TIMEOUT 60 PROPERTIES TIMEOUT ${test_TIMEOUT})
 endfunction()
 
 # The same for a test of what the library does not export: it holds the library itself and sees its sources. The support

@@ -1,10 +1,8 @@
 // The change feed: a client that follows it alone knows the account.
-#include <functional>
 #include <map>
-#include <random>
 #include <set>
-#include <sstream>
 
+#include "random_changes.h"
 #include "socket_client.h"
 #include "tree_fixture.h"
 
@@ -12,46 +10,11 @@ using namespace emulator;
 
 namespace {
 
-struct known_entry {
-    std::string parent;
-    std::string revision;
-    std::map<std::string, std::string> info; // what its own description says
-
-    bool operator==(const known_entry &other) const
-    {
-        return parent == other.parent && revision == other.revision && info == other.info;
-    }
-};
-using entries = std::map<std::string, known_entry>;
-
 // What a feed must keep true. Counts of folders and downloads are no changes of an entry.
 constexpr const char *folder_facts[] = {"name",       "description", "tags",
                                         "owner_name", "permissions", "privacy"};
 constexpr const char *file_facts[] = {"filename", "tags",       "size",       "hash",
                                       "privacy",  "owner_name", "permissions"};
-
-std::ostream &operator<<(std::ostream &out, const known_entry &entry)
-{
-    out << "below " << entry.parent << " at " << entry.revision;
-    for (const auto &[name, value] : entry.info)
-        out << ", " << name << " " << value;
-    return out;
-}
-
-/** What tells the two apart, one entry on a line; empty when nothing does. */
-std::string difference(const entries &known, const entries &listed)
-{
-    std::ostringstream lines;
-    for (const auto &[key, entry] : known)
-        if (listed.count(key) == 0)
-            lines << "known but not listed: " << key << ' ' << entry << '\n';
-        else if (!(listed.at(key) == entry))
-            lines << "known: " << key << ' ' << entry << "\nlisted: " << listed.at(key) << '\n';
-    for (const auto &[key, entry] : listed)
-        if (known.count(key) == 0)
-            lines << "listed but not known: " << key << ' ' << entry << '\n';
-    return lines.str();
-}
 
 class Changes : public Tree {
 protected:
@@ -77,6 +40,14 @@ protected:
                 entry.info[fact] = element(body, fact);
         entry.info["kind"] = kind;
         return entry;
+    }
+
+    change_outcome told(const std::string &who, const std::string &action, const pairs &given)
+    {
+        const reply made = ask(who, action, given);
+        EXPECT_NE(made.http_status, 500u) << action << made.body;
+        return {made.http_status == 200, element(made.body, "folder_key"),
+                element(made.body, "quickkey")};
     }
 
     /** Follows the feed as a client would, from where it stands to where the account is. */
@@ -155,103 +126,6 @@ protected:
                 return all;
         }
     }
-};
-
-/** Makes changes at random, through the router, for both accounts. */
-class random_client {
-public:
-    using action = std::function<reply(const std::string &, const std::string &, const pairs &)>;
-
-    random_client(std::uint32_t seed, action ask) : random_(seed), ask_(std::move(ask)) {}
-
-    void learn(const std::string &who, const entries &known)
-    {
-        folders_[who].clear();
-        files_[who].clear();
-        // By revision, since keys are different in every run.
-        std::map<std::uint64_t, std::string> ordered;
-        for (const auto &[key, entry] : known)
-            ordered.emplace(std::stoull(entry.revision), key);
-        for (const auto &[revision, key] : ordered)
-            (known.at(key).info.at("kind") == "folder" ? folders_ : files_)[who].push_back(key);
-    }
-
-    /** Returns whether it was granted: what is refused must change nothing. */
-    bool change(const std::string &who, const std::string &other)
-    {
-        const std::string name = "n" + std::to_string(below(40));
-        switch (below(16)) {
-        case 0:
-        case 1:
-        case 2:
-            return tell(who, "folder/create", {{"foldername", name}, {"parent_key", folder(who)}});
-        case 3:
-        case 4:
-        case 5:
-        case 6:
-            return tell(who, "file/create", {{"filename", name}, {"parent_key", folder(who)}});
-        case 7:
-            return tell(who, "folder/update",
-                        {{"folder_key", folder(who)}, {"foldername", name}, {"tags", name}});
-        case 8:
-            return tell(who, "file/update", {{"quick_key", file(who)}, {"filename", name}});
-        case 9:
-            return tell(who, "folder/update",
-                        {{"folder_key", folder(who)},
-                         {"privacy", below(3) == 0 ? "private" : "public"},
-                         {"privacy_recursive", below(2) == 0 ? "yes" : "no"}});
-        case 10:
-            return tell(who, "folder/move",
-                        {{"folder_key_src", folder(who)}, {"folder_key_dst", folder(who)}});
-        case 11:
-            return tell(who, "file/move", {{"quick_key", file(who)}, {"folder_key", folder(who)}});
-        case 12:
-            return files_[who].size() < 300 &&
-                   tell(who, "folder/copy",
-                        {{"folder_key_src", folder(who)}, {"folder_key_dst", folder(who)}});
-        case 13:
-            return tell(who, below(3) == 0 ? "folder/delete" : "file/delete",
-                        {{"folder_key", folder(who)}, {"quick_key", file(who)}});
-        case 14:
-            return tell(who, "folder/attach_foreign", {{"folder_key", folder(other)}});
-        default:
-            return tell(who, "folder/detach_foreign", {{"folder_key", folder(who)}});
-        }
-    }
-
-private:
-    std::uint32_t below(std::uint32_t end)
-    {
-        return static_cast<std::uint32_t>(random_() % end); // the same on every machine
-    }
-
-    std::string one_of(const std::vector<std::string> &keys)
-    {
-        return keys.empty() ? "" : keys[below(static_cast<std::uint32_t>(keys.size()))];
-    }
-
-    std::string folder(const std::string &who) { return one_of(folders_[who]); }
-    std::string file(const std::string &who) { return one_of(files_[who]); }
-
-    bool tell(const std::string &who, const std::string &action_name, const pairs &given)
-    {
-        const reply made = ask_(who, action_name, given);
-        EXPECT_NE(made.http_status, 500u) << action_name << made.body;
-        if (made.http_status != 200)
-            return false;
-        const std::string folder_key = element(made.body, "folder_key");
-        if (!folder_key.empty())
-            folders_[who].push_back(folder_key);
-        const std::string quick_key = element(made.body, "quickkey");
-        if (!quick_key.empty())
-            files_[who].push_back(quick_key);
-        return true;
-    }
-
-    std::mt19937 random_;
-    action ask_;
-    std::map<std::string, std::vector<std::string>> folders_;
-    std::map<std::string, std::vector<std::string>> files_;
 };
 
 } // namespace
@@ -365,8 +239,9 @@ TEST_F(Changes, BelongToOneAccount)
 
 TEST_F(Changes, FollowedAloneGiveWhatTheListingsShow)
 {
-    random_client client(20260301, [this](const std::string &who, const std::string &action,
-                                          const pairs &given) { return ask(who, action, given); });
+    random_changes client(20260301,
+                          [this](const std::string &who, const std::string &action,
+                                 const pairs &given) { return told(who, action, given); });
     replica anns{ann, 0, {}};
     replica bobs{bob, 0, {}};
     // A second one asks seldom, so that it has blocks to catch up.

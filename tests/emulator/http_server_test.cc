@@ -25,11 +25,13 @@ class HttpServer : public testing::Test {
 protected:
     void start(const server_limits &with)
     {
-        server.emplace(context, with, [this](const request &asked) {
+        const auto echo = [this](const request &asked) {
             ++answered;
             return reply{200, asked.method + " " + asked.target + " " + asked.content_type + " [" +
                                   asked.body + "]"};
-        });
+        };
+        server.emplace(context, with,
+                       request_handlers{echo, [](const request &) { return nullptr; }});
         port = server->listen(0, nullptr);
         thread = std::thread([this] { context.run(); });
     }
@@ -285,7 +287,7 @@ TEST_F(HttpServer, SaysThatAPortIsTaken)
 {
     start(small());
     boost::asio::io_context other_context;
-    http_server other(other_context, {}, nullptr);
+    http_server other(other_context, {}, {});
 
     EXPECT_THROW(other.listen(port, nullptr), std::runtime_error);
 }

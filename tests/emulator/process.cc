@@ -9,8 +9,10 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include "digest.h"
 #include "files.h"
 #include "scratch_directory.h"
+#include "socket_client.h"
 
 extern char **environ;
 
@@ -154,4 +156,14 @@ finished_process run_program(const std::vector<std::string> &arguments, const st
     files.open(STDERR_FILENO, err, O_WRONLY | O_CREAT);
     const int exit_code = wait_for(spawn(arguments, files));
     return {exit_code, emulator::read_file(out, 1 << 20), emulator::read_file(err, 1 << 20)};
+}
+
+std::string log_in(std::uint16_t port)
+{
+    const std::string signature =
+        emulator::sha1_hex("ann@example.orgsecret42quillmere-development-key");
+    return element(get(port, "/api/user/get_session_token.php?application_id=42"
+                             "&email=ann%40example.org&password=secret&signature=" +
+                                 signature + "&version=2"),
+                   "session_token");
 }

@@ -67,3 +67,6 @@ struct finished_process {
 /** Runs the program to its end with the text as its standard input. */
 finished_process run_program(const std::vector<std::string> &arguments,
                              const std::string &input = {});
+
+/** A session of ann@example.org, whose password is "secret". */
+std::string log_in(std::uint16_t port);

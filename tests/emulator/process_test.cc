@@ -13,7 +13,6 @@
 
 #include <gtest/gtest.h>
 
-#include "digest.h"
 #include "files.h"
 #include "scratch_directory.h"
 #include "socket_client.h"
@@ -44,17 +43,6 @@ protected:
             {"add-account", "--data", data, "--email", "ann@example.org", "--password-file", "-"},
             "secret\n");
         ASSERT_EQ(done.exit_code, 0) << done.errors;
-    }
-
-    static std::string log_in(const server_process &server)
-    {
-        const std::string signature =
-            emulator::sha1_hex("ann@example.orgsecret42quillmere-development-key");
-        return element(
-            get(server.http_port(), "/api/user/get_session_token.php?application_id=42"
-                                    "&email=ann%40example.org&password=secret&signature=" +
-                                        signature + "&version=2"),
-            "session_token");
     }
 
     static std::string device_status(const server_process &server, const std::string &token)
@@ -156,7 +144,7 @@ TEST_F(Process, KeepsItsSessionsOverARestart)
     std::string token;
     {
         server_process server(data);
-        token = log_in(server);
+        token = log_in(server.http_port());
         EXPECT_EQ(server.stop(SIGTERM), 0);
     }
 
@@ -172,7 +160,7 @@ TEST_F(Process, KeepsWhatItAcknowledgedOverAKill)
         std::string token;
         {
             server_process server(data);
-            token = log_in(server);
+            token = log_in(server.http_port());
             server.stop(SIGKILL);
         }
 
@@ -187,7 +175,7 @@ TEST_F(Process, TakesAnAccountThatIsMadeWhileItServes)
 
     add_ann();
 
-    EXPECT_EQ(log_in(server).size(), 64u);
+    EXPECT_EQ(log_in(server.http_port()).size(), 64u);
 }
 
 TEST_F(Process, TakesAnApplicationThatIsRegisteredWhileItServes)
@@ -199,7 +187,7 @@ TEST_F(Process, TakesAnApplicationThatIsRegisteredWhileItServes)
             .exit_code,
         0);
 
-    EXPECT_EQ(log_in(server), "");
+    EXPECT_EQ(log_in(server.http_port()), "");
 }
 
 TEST_F(Process, SessionLifetimeIsAnOption)
@@ -207,7 +195,7 @@ TEST_F(Process, SessionLifetimeIsAnOption)
     add_ann();
     const std::int64_t before = std::time(nullptr);
     const server_process server(data, {"--session-lifetime", "7000"});
-    log_in(server);
+    log_in(server.http_port());
 
     emulator::database store(std::filesystem::path(data) / "store.sqlite");
     emulator::statement query = store.prepare("SELECT expires FROM sessions");

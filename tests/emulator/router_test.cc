@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include "digest.h"
+#include "errors.h"
 #include "scratch_directory.h"
 #include "socket_client.h"
 #include "store/accounts.h"

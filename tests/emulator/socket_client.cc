@@ -130,6 +130,12 @@ std::string get(std::uint16_t port, const std::string &target)
 std::string get_verified(std::uint16_t port, const std::string &target,
                          const std::filesystem::path &root, const std::string &name)
 {
+    return ask_verified(port, get_request(target), root, name);
+}
+
+std::string ask_verified(std::uint16_t port, const std::string &request,
+                         const std::filesystem::path &root, const std::string &name)
+{
     const emulator::descriptor socket = connect_to(port, name == "::1");
     const auto context = verifying_context(root);
     const std::unique_ptr<SSL, tls_deleter> session(SSL_new(context.get()));
@@ -137,7 +143,6 @@ std::string get_verified(std::uint16_t port, const std::string &target,
     SSL_set_fd(session.get(), socket.number());
     if (SSL_connect(session.get()) != 1)
         throw std::runtime_error("TLS handshake");
-    const std::string request = get_request(target);
     SSL_write(session.get(), request.data(), static_cast<int>(request.size()));
     std::string reply;
     char piece[4096];

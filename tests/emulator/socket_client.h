@@ -41,5 +41,9 @@ std::string get(std::uint16_t port, const std::string &target);
 std::string get_verified(std::uint16_t port, const std::string &target,
                          const std::filesystem::path &root, const std::string &name);
 
+/** The same of a whole request, which must ask the server to close. */
+std::string ask_verified(std::uint16_t port, const std::string &request,
+                         const std::filesystem::path &root, const std::string &name);
+
 /** The text of the first element of this name, or an empty text. */
 std::string element(const std::string &reply, const std::string &name);

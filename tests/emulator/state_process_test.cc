@@ -9,7 +9,6 @@
 
 #include <gtest/gtest.h>
 
-#include "digest.h"
 #include "files.h"
 #include "process.h"
 #include "scratch_directory.h"
@@ -52,16 +51,6 @@ protected:
         const finished_process done = run_program({"--data", data, "--dump"});
         EXPECT_EQ(done.exit_code, 0) << done.errors;
         return done.output;
-    }
-
-    static std::string log_in(std::uint16_t port)
-    {
-        const std::string signature =
-            emulator::sha1_hex("ann@example.orgsecret42quillmere-development-key");
-        return element(get(port, "/api/user/get_session_token.php?application_id=42"
-                                 "&email=ann%40example.org&password=secret&signature=" +
-                                     signature),
-                       "session_token");
     }
 
     /** The path of the direct link of the only file. */

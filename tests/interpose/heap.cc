@@ -1,28 +1,15 @@
 #include "interpose/heap.h"
 
-#include <cstdlib>
-#include <cstring>
+#include "interpose/ration.h"
+#include "interpose/real_heap.h"
 
 namespace quillmere_test {
 namespace {
 
-thread_local size_t allowed_left = 0;
-thread_local size_t refusals_left = 0;
-thread_local size_t refusals_made = 0;
+thread_local ration allocations;
 thread_local int64_t held = 0;
 
-bool refuse()
-{
-    if (allowed_left > 0) {
-        --allowed_left;
-        return false;
-    }
-    if (refusals_left == 0)
-        return false;
-    --refusals_left;
-    ++refusals_made;
-    return true;
-}
+bool refuse() { return allocations.refuses(); }
 
 void *counted(void *block)
 {
@@ -35,14 +22,12 @@ void *counted(void *block)
 
 starved_heap::starved_heap(size_t allowed, size_t refusals)
 {
-    allowed_left = allowed;
-    refusals_left = refusals;
-    refusals_made = 0;
+    allocations = {allowed, refusals, 0};
 }
 
-starved_heap::~starved_heap() { refusals_left = 0; }
+starved_heap::~starved_heap() { allocations = {}; }
 
-size_t starved_heap::refused() const { return refusals_made; }
+size_t starved_heap::refused() const { return allocations.refused; }
 
 int64_t blocks_held() { return held; }
 
@@ -50,15 +35,8 @@ int64_t blocks_held() { return held; }
 
 using namespace quillmere_test;
 
-// The linker gives the library's calls to the __wrap_ names and the C library's functions the
-// __real_ names.
+// The linker gives the library's calls to the __wrap_ names.
 extern "C" {
-
-void *real_malloc(size_t size) __asm__("__real_malloc");
-void *real_calloc(size_t count, size_t size) __asm__("__real_calloc");
-void *real_realloc(void *block, size_t size) __asm__("__real_realloc");
-char *real_strdup(const char *text) __asm__("__real_strdup");
-void real_free(void *block) __asm__("__real_free");
 
 void *counting_malloc(size_t size) __asm__("__wrap_malloc");
 void *counting_calloc(size_t count, size_t size) __asm__("__wrap_calloc");

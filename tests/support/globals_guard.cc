@@ -88,6 +88,7 @@ globals_guard::~globals_guard()
     ca_cert_pem_path.connection_attempts = connection_attempts_;
     replace_owned_text(ca_cert_pem_path.path, ca_path_);
     restore_proxy();
+    set_response_limit(0);
 }
 
 void globals_guard::restore_proxy() const

@@ -1,5 +1,5 @@
-// Puts every exported variable of the library back as it was, and every environment variable that
-// a test changes.
+// Puts every exported variable of the library back as it was, the settings behind functions at
+// their initial values, and every environment variable that a test changes.
 #pragma once
 
 #include <cstdint>

@@ -2,9 +2,11 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <thread>
 
 #include "support/library_fixture.h"
 #include "support/stdout_capture.h"
+#include "support/thread_log.h"
 
 namespace quillmere_test {
 namespace {
@@ -25,6 +27,30 @@ TEST(LogCapture, HoldsTheLogAndPutsTheStreamBack)
     stdout_capture out;
     qm_printf("three\n");
     EXPECT_EQ(out.text(), "three\n");
+}
+
+TEST(ThreadLog, KeepsTheLinesOfEachThreadApart)
+{
+    thread_log log;
+    std::string others;
+    qm_printf("one %d, ", 1);
+
+    std::thread other([&] {
+        for (int line = 0; line < 100; ++line)
+            qm_printf("two %d\n", 2);
+        others = thread_log::take();
+    });
+    for (int line = 0; line < 100; ++line)
+        qm_printf("%s", "more");
+    other.join();
+
+    std::string expected = "one 1, ";
+    for (int line = 0; line < 100; ++line)
+        expected += "more";
+    EXPECT_EQ(thread_log::take(), expected);
+    EXPECT_EQ(thread_log::take(), "");
+    EXPECT_EQ(others.size(), 600u);
+    EXPECT_EQ(others.find("more"), std::string::npos);
 }
 
 TEST(GlobalsGuard, PutsEveryVariableBack)

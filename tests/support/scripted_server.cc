@@ -1,6 +1,5 @@
 #include "support/scripted_server.h"
 
-#include <arpa/inet.h>
 #include <gtest/gtest.h>
 #include <netinet/in.h>
 #include <netinet/tcp.h>
@@ -11,66 +10,11 @@
 
 #include <cstring>
 
+#include "support/bound_socket.h"
 #include "support/failure.h"
 #include "support/signals_blocked.h"
 
 namespace quillmere_test {
-namespace {
-
-struct loopback_address {
-    sockaddr_storage storage = {};
-    socklen_t length = 0;
-
-    explicit loopback_address(const std::string &text)
-    {
-        auto v4 = reinterpret_cast<sockaddr_in *>(&storage);
-        auto v6 = reinterpret_cast<sockaddr_in6 *>(&storage);
-        if (inet_pton(AF_INET, text.c_str(), &v4->sin_addr) == 1) {
-            storage.ss_family = AF_INET;
-            length = sizeof *v4;
-        } else if (inet_pton(AF_INET6, text.c_str(), &v6->sin6_addr) == 1) {
-            storage.ss_family = AF_INET6;
-            length = sizeof *v6;
-        } else {
-            throw std::invalid_argument("no address: " + text);
-        }
-    }
-    // The port stands at the same place in both families.
-    uint16_t port() const
-    {
-        return ntohs(reinterpret_cast<const sockaddr_in *>(&storage)->sin_port);
-    }
-    void take(uint16_t wanted)
-    {
-        reinterpret_cast<sockaddr_in *>(&storage)->sin_port = htons(wanted);
-    }
-    sockaddr *generic() { return reinterpret_cast<sockaddr *>(&storage); }
-};
-
-// A socket bound to the port, or to one that the kernel picks for 0; port receives it.
-descriptor bound_socket(const std::string &text, uint16_t &port)
-{
-    loopback_address address(text);
-    int kind = SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC;
-    descriptor socket(::socket(address.storage.ss_family, kind, 0));
-    require(bool(socket), "socket");
-    address.take(port);
-    int yes = 1; // a port that was chosen must not stay taken by a connection that has ended
-    if (port != 0)
-        ::setsockopt(socket.number(), SOL_SOCKET, SO_REUSEADDR, &yes, sizeof yes);
-    require(::bind(socket.number(), address.generic(), address.length) == 0, "bind " + text);
-    require(::getsockname(socket.number(), address.generic(), &address.length) == 0, "getsockname");
-    port = address.port();
-    return socket;
-}
-
-std::string url_of(const std::string &scheme, const std::string &host, uint16_t port)
-{
-    bool bare_v6 = host.find(':') != std::string::npos && host[0] != '[';
-    return scheme + "://" + (bare_v6 ? "[" + host + "]" : host) + ":" + std::to_string(port);
-}
-
-} // namespace
 
 server_options tls_with(const certificate &leaf)
 {
@@ -112,8 +56,7 @@ scripted_server::scripted_server(server_options options)
     answer(http_reply(500, "the test gave this server no script"));
     stop_ = descriptor(::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK));
     require(bool(stop_), "eventfd");
-    listener_ = bound_socket(options_.address, port_);
-    require(::listen(listener_.number(), SOMAXCONN) == 0, "listen");
+    listener_ = listening_socket(options_.address, port_);
     signals_blocked in_new_threads;
     acceptor_ = std::thread(&scripted_server::accept_clients, this);
 }
@@ -301,6 +244,31 @@ refused_port::refused_port() : port_(0)
 }
 
 std::string refused_port::base_url(const std::string &scheme) const
+{
+    return url_of(scheme, "127.0.0.1", port_);
+}
+
+full_port::full_port() : port_(0)
+{
+    socket_ = bound_socket("127.0.0.1", port_);
+    require(::listen(socket_.number(), 0) == 0, "listen");
+    while (takes_another())
+        continue;
+}
+
+bool full_port::takes_another()
+{
+    constexpr int long_on_loopback = 200; // milliseconds
+    uint16_t any_port = 0;
+    descriptor &client = waiting_.emplace_back(bound_socket("127.0.0.1", any_port));
+    if (connect_to(client, "127.0.0.1", port_) == 0)
+        return true;
+    require(errno == EINPROGRESS, "connect");
+    pollfd wait = {client.number(), POLLOUT, 0};
+    return ::poll(&wait, 1, long_on_loopback) > 0;
+}
+
+std::string full_port::base_url(const std::string &scheme) const
 {
     return url_of(scheme, "127.0.0.1", port_);
 }

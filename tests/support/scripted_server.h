@@ -167,4 +167,20 @@ private:
     uint16_t port_;
 };
 
+// A port of the loopback interface that listens, but lets no further connection come about: its
+// queue is full, and nobody takes anything out of it.
+class full_port {
+public:
+    full_port();
+
+    std::string base_url(const std::string &scheme = "http") const;
+
+private:
+    bool takes_another();
+
+    descriptor socket_;
+    std::vector<descriptor> waiting_;
+    uint16_t port_;
+};
+
 } // namespace quillmere_test

@@ -1,6 +1,5 @@
 // The command line, the library and the local service together, as a user would run them.
 #include <filesystem>
-#include <memory>
 #include <string>
 
 #include <sys/stat.h>
@@ -9,9 +8,8 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
-#include "program.h"
+#include "emulator_account.h"
 #include "support/certificates.h"
-#include "support/process.h"
 #include "support/scripted_server.h"
 
 namespace quillmere_test {
@@ -23,64 +21,12 @@ using testing::IsEmpty;
 using testing::MatchesRegex;
 using testing::Not;
 
-constexpr const char *email = "someone@example.org";
-constexpr const char *password = "a pass word & more \xc3\xa4";
-
-class Emulator : public testing::Test {
+class Emulator : public emulator_account {
 protected:
-    Emulator()
-    {
-        add_account();
-        start({});
-    }
-
-    void add_account() const
-    {
-        command what;
-        what.program = QUILLMERE_EMULATOR;
-        what.arguments = {"add-account",
-                          "--data",
-                          data,
-                          "--email",
-                          email,
-                          "--password-file",
-                          "-",
-                          "--facebook-token-file",
-                          home.folder().write("facebook-token", "a-token-of-facebook\n")};
-        what.input = std::string(password) + "\n";
-        const outcome ended = run(what);
-        ASSERT_EQ(ended.exit_status, 0) << ended.err;
-    }
-
-    void start(const std::vector<std::string> &more)
-    {
-        command what;
-        what.program = QUILLMERE_EMULATOR;
-        what.arguments = {"--data",     data, "--port",       "0",       "--http-port", "0",
-                          "--ready-fd", "3",  "--ready-file", ready_file};
-        what.arguments.insert(what.arguments.end(), more.begin(), more.end());
-        emulator = std::make_unique<process>(what);
-        const std::string line = emulator->wait_for_line(channel::report, "https_url");
-        base = nlohmann::json::parse(line).at("https_url");
-        home.environment["QUILLMERE_EMULATOR"] = ready_file;
-    }
-
-    outcome sign_in(std::vector<std::string> more = {}) const
-    {
-        more.insert(more.begin(), {"login", email, "--password-stdin"});
-        return home.run(more, std::string(password) + "\n");
-    }
-
     std::string token() const
     {
         return nlohmann::json::parse(content_of(home.session_path())).at("session_token");
     }
-
-    program_home home;
-    const std::string data = home.folder().path_of("emulator");
-    const std::string ready_file = home.folder().path_of("ready.json");
-    std::unique_ptr<process> emulator;
-    std::string base;
 };
 
 TEST_F(Emulator, LetsAUserSignInAndReadTheirDevice)
@@ -89,7 +35,7 @@ TEST_F(Emulator, LetsAUserSignInAndReadTheirDevice)
     const outcome read = home.run({"device-status"});
 
     EXPECT_EQ(signed_in.exit_status, 0) << signed_in.err;
-    EXPECT_EQ(signed_in.out, "Signed in to " + base + " as " + email + "\n");
+    EXPECT_EQ(signed_in.out, "Signed in to " + base + " as " + account_email + "\n");
     EXPECT_EQ(read.exit_status, 0) << read.err;
     EXPECT_THAT(read.out, MatchesRegex("Device            0\n"
                                        "Revision          [0-9]+\n"
@@ -108,7 +54,7 @@ TEST_F(Emulator, AcceptsAFacebookToken)
 
 TEST_F(Emulator, RefusesAWrongPasswordByNumber)
 {
-    const outcome ended = home.run({"login", email, "--password-stdin"}, "wrong\n");
+    const outcome ended = home.run({"login", account_email, "--password-stdin"}, "wrong\n");
 
     EXPECT_EQ(ended.exit_status, 3);
     EXPECT_THAT(ended.err, MatchesRegex("quillmere: signing in failed: 107: [^\n]+\n"));
@@ -156,7 +102,7 @@ TEST_F(Emulator, SessionIsForItsOwnerAlone)
     ASSERT_EQ(::stat(home.session_path().c_str(), &facts), 0);
     EXPECT_EQ(facts.st_mode & 0777U, 0600U);
     const auto kept = nlohmann::json::parse(content_of(home.session_path()));
-    EXPECT_EQ(kept.at("email"), email);
+    EXPECT_EQ(kept.at("email"), account_email);
     EXPECT_EQ(kept.at("service"), base);
     EXPECT_THAT(kept.dump(), Not(HasSubstr("pass")));
 }
@@ -172,7 +118,7 @@ TEST_F(Emulator, SecretsAreNeverShown)
     const std::string seen = first.out + first.err + second.out + second.err + content_of(log);
     EXPECT_THAT(seen, AllOf(HasSubstr("session_token=(masked)"), HasSubstr("password=(masked)")));
     for (const std::string &secret :
-         {token(), std::string(password), std::string("a%20pass%20word"),
+         {token(), std::string(account_password), std::string("a%20pass%20word"),
           std::string("quillmere-development-key")})
         EXPECT_THAT(seen, Not(HasSubstr(secret)));
 }

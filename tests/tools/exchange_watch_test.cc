@@ -41,6 +41,31 @@ TEST(ExchangeWatch, TakesTheGeneralReasonWhereThereIsNoOther)
     EXPECT_EQ(watch.error()->text, "Timeout was reached");
 }
 
+TEST(ExchangeWatch, ReadsWhatTheUploadConnectionSays)
+{
+    const struct {
+        std::string_view line;
+        int code;
+        const char *text;
+    } rows[] = {
+        {"Curl error: Couldn't connect to server\n", 0, "Couldn't connect to server"},
+        {"Error: 55 Failed sending data to the peer\n", 55, "Failed sending data to the peer"},
+        {"Error: Connection timeout.\n", 28, "nothing moved for 60 seconds"},
+        {"Error: Transmission timeout.\n", 28, "nothing moved for 60 seconds"},
+    };
+    for (const auto &row : rows) {
+        exchange_watch watch;
+        watch.feed(row.line);
+        ASSERT_TRUE(watch.error().has_value()) << row.line;
+        EXPECT_EQ(watch.error()->code, row.code);
+        EXPECT_EQ(watch.error()->text, row.text);
+    }
+
+    exchange_watch patient;
+    patient.feed("Error: wait_on_socket failed.\n");
+    EXPECT_FALSE(patient.error().has_value()) << "it is tried again";
+}
+
 TEST(ExchangeWatch, KeepsTheBeginningOfTheBody)
 {
     exchange_watch watch;

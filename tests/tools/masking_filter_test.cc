@@ -86,6 +86,10 @@ constexpr masking_case cases[] = {
     {"OrdinaryElements", "<quickkey>abc</quickkey>", "<quickkey>abc</quickkey>"},
     {"QuotedValue", "<a password=\"x y&z\">b</a>", "<a password=\"(masked)\">b</a>"},
     {"QuotedBySingleMarks", "password='x\"y' z", "password='(masked)' z"},
+    {"QuotedValueThatIsCutOff", "password=\"ab password=\"cd\" e", "password=\"(masked)\" e"},
+    {"QuotedValueThatIsCutOffAheadOfATag", "password=\"ab <pkey c=\"d\">e</pkey> f",
+     "password=\"(masked)>(masked)</pkey> f"},
+    {"QuotedValueThatEndsLikeAName", "password=\"token\" a=\"b\"", "password=\"(masked)\" a=\"b\""},
     {"LinkInAPage", "<a href=\"/p?session_token=abc&amp;x=1\">",
      "<a href=\"/p?session_token=(masked)&amp;x=1\">"},
 };

@@ -44,6 +44,69 @@ TEST(Results, AreAsciiInJson)
             << int{letter};
 }
 
+TEST(Results, ForScriptsAloneAreNotShownToPeople)
+{
+    const std::vector<fact> hidden = {{"a", nullptr, 1}, {"b", "B", 2}};
+
+    EXPECT_EQ(facts_as_text(hidden, false), "B  2\n");
+    EXPECT_EQ(nlohmann::json::parse(facts_as_json(hidden)).size(), 2U);
+}
+
+TEST(ResultGroups, LeaveOutWhatIsNotKnown)
+{
+    const std::vector<fact_group> groups = {
+        {"one", {{"a", "A", "x"}, {"b", "Nothing", nullptr}, {"c", "Empty", ""}}},
+        {"two", {{"a", "Again", 0}, {"d", "No", false}}}};
+
+    EXPECT_EQ(groups_as_text(groups, false), "A      x\nAgain  0\nNo     no\n");
+}
+
+TEST(ResultGroups, AreObjectsForScripts)
+{
+    const auto document = nlohmann::ordered_json::parse(
+        groups_as_json({{"one", {{"a", "A", "x"}, {"b", "B", nullptr}}}, {"two", {}}}));
+
+    EXPECT_EQ(document.dump(), R"({"one":{"a":"x","b":null},"two":{}})");
+}
+
+const result_table files = {
+    "files",
+    {{"size", "Size"}, {"key", "Key"}, {"name", "Name"}},
+    {{{"name", nullptr, "a\x1b  "}, {"size", nullptr, 1000000}, {"more", nullptr, true}},
+     {{"key", nullptr, "k"}, {"name", nullptr, "b"}, {"size", nullptr, 5}}}};
+
+TEST(ResultTables, HaveHeadingsAndNumbersToTheRight)
+{
+    EXPECT_EQ(table_as_text(files, true), "   Size  Key  Name\n"
+                                          "1000000  -    a\\u{1b}  \n"
+                                          "      5  k    b\n");
+    EXPECT_EQ(table_as_text(files, false).find("a\x1b  \n"), 33U);
+}
+
+TEST(ResultTables, TakeAColumnWithOneTextToTheLeft)
+{
+    result_table mixed = {"rows", {{"a", "A"}, {"b", "B"}}, {}};
+    mixed.rows = {{{"a", nullptr, 1000}, {"b", nullptr, 1}}, {{"a", nullptr, "x"}}};
+
+    EXPECT_EQ(table_as_text(mixed, false), "A     B\n1000  1\nx     -\n");
+}
+
+TEST(ResultTables, WithoutRowsShowNothing)
+{
+    EXPECT_EQ(table_as_text({"rows", {{"a", "A"}}, {}}, false), "");
+    EXPECT_EQ(nlohmann::json::parse(table_as_json({}, {"rows", {}, {}})).dump(), R"({"rows":[]})");
+}
+
+TEST(ResultTables, AreArraysOfWholeObjectsForScripts)
+{
+    const auto document =
+        nlohmann::ordered_json::parse(table_as_json({{"about", "About", 3}}, files));
+
+    EXPECT_EQ(document.dump(), R"({"about":3,"files":[)"
+                               R"({"name":"a\u001b  ","size":1000000,"more":true},)"
+                               R"({"key":"k","name":"b","size":5}]})");
+}
+
 TEST(Numbers, AreNumbersOnlyWhenWrittenAsSuch)
 {
     EXPECT_EQ(number_or_text("0"), 0);
@@ -52,6 +115,14 @@ TEST(Numbers, AreNumbersOnlyWhenWrittenAsSuch)
     for (const char *text : {"", "-1", "1.5", "007", "12 ", "0x1", "OK"})
         EXPECT_EQ(number_or_text(text), text);
     EXPECT_TRUE(number_or_text(nullptr).is_null());
+}
+
+TEST(Numbers, AreReadWholeOrNotAtAll)
+{
+    EXPECT_EQ(decimal_number("0"), 0U);
+    EXPECT_EQ(decimal_number("18446744073709551615"), 18446744073709551615U);
+    for (const char *text : {"18446744073709551616", "", "-1", "+1", " 1", "1 ", "010", "0x1"})
+        EXPECT_EQ(decimal_number(text), std::nullopt) << text;
 }
 
 TEST(Escaping, WritesOutWhatATerminalWouldObey)

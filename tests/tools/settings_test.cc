@@ -177,14 +177,15 @@ TEST_F(Settings, HaveNoBundleOnlyWhenVerificationIsOff)
     EXPECT_FALSE(decided().ca.has_value());
 }
 
-TEST_F(Settings, PointThePlainAddressesAtTheSecureOnes)
+TEST_F(Settings, PointThePlainAddressAtTheSecureOne)
 {
     given.emulator = ready_file();
 
     const service_addresses addresses = decided().addresses;
 
     EXPECT_EQ(addresses.plain, "https://127.0.0.1:1");
-    EXPECT_EQ(addresses.plain_upload, "https://127.0.0.1:1/api/upload/upload.php?type=desktop");
+    EXPECT_EQ(addresses.plain_upload, "http://127.0.0.1:2/api/upload/upload.php?type=desktop")
+        << "which uploads to this machine alone use";
     EXPECT_EQ(addresses.secure_upload, "https://127.0.0.1:1/api/upload/upload.php?type=desktop");
 }
 

@@ -30,7 +30,11 @@ TEST_F(Usage, IsExplainedOnRequest)
     const outcome ended = home.run({"--help"});
 
     EXPECT_EQ(ended.exit_status, 0);
-    for (const char *command : {"login", "logout", "status", "limits", "device-status"})
+    for (const char *command : {"login",  "logout",  "renew",  "login-token",
+                                "whoami", "status",  "limits", "device-status",
+                                "ls",     "stat",    "mkdir",  "create",
+                                "rm",     "mv",      "cp",     "set",
+                                "links",  "changes", "attach", "detach"})
         EXPECT_THAT(ended.out, HasSubstr(command));
     EXPECT_THAT(ended.err, IsEmpty());
 }
@@ -66,6 +70,82 @@ TEST_F(Usage, IsWrongWithoutACommandOrWithAnUnknownOne)
         EXPECT_THAT(ended.err, StartsWith("quillmere: ")) << testing::PrintToString(arguments);
         EXPECT_THAT(ended.out, IsEmpty());
     }
+}
+
+TEST_F(Usage, OfACommandOnTheAccountIsWrongBeforeAnythingIsAsked)
+{
+    using words = std::vector<std::string>;
+    home.environment["SSL_CERT_FILE"] = test_root_path();
+    home.sign_in("https://127.0.0.1:1", "token"); // where there is no answer, which is another code
+    for (const words &arguments : {words{"whoami", "extra"},
+                                   words{"ls", "/a", "/b"},
+                                   words{"ls", ""},
+                                   words{"ls", "/.."},
+                                   words{"ls", "key:a&b"},
+                                   words{"stat"},
+                                   words{"mkdir"},
+                                   words{"mkdir", "/a", "--depth"},
+                                   words{"create"},
+                                   words{"rm"},
+                                   words{"rm", "-r"},
+                                   words{"rm", "/"},
+                                   words{"mv", "/a"},
+                                   words{"mv", "/", "/a"},
+                                   words{"cp", "/a"},
+                                   words{"cp", "-r", "/", "/a"},
+                                   words{"set", "/a"},
+                                   words{"set", "/", "--tags", "x"},
+                                   words{"set", "/a", "--name", ""},
+                                   words{"set", "/a", "--time", ""},
+                                   words{"set", "/a", "--privacy", "secret"},
+                                   words{"set", "/a", "--tags", "x", "--recursive"},
+                                   words{"set", "--tags", "x"},
+                                   words{"links"},
+                                   words{"links", "/a", "--type", "hidden"},
+                                   words{"links", "/a", "--type", "view", "--download"},
+                                   words{"changes", "--since", "-1"},
+                                   words{"changes", "--since", "18446744073709551616"},
+                                   words{"changes", "--since", "010"},
+                                   words{"changes", "--since", "1", "--sample"},
+                                   words{"changes", "--device", "4294967296"},
+                                   words{"attach"},
+                                   words{"attach", "/a"},
+                                   words{"attach", "key:a/b"},
+                                   words{"detach"},
+                                   words{"login-token", "a@b"}}) {
+        const outcome ended = home.run(arguments);
+        EXPECT_EQ(ended.exit_status, 2) << testing::PrintToString(arguments) << ended.err;
+        EXPECT_THAT(ended.err, StartsWith("quillmere: ")) << testing::PrintToString(arguments);
+        EXPECT_THAT(ended.out, IsEmpty());
+    }
+}
+
+TEST_F(Usage, OfTheAccountNeedsASession)
+{
+    using words = std::vector<std::string>;
+    for (const words &arguments :
+         {words{"renew"}, words{"whoami"}, words{"ls"}, words{"stat", "/"}, words{"mkdir", "/a"},
+          words{"create", "/a"}, words{"rm", "/a"}, words{"mv", "/a", "/b"},
+          words{"cp", "/a", "/b"}, words{"set", "/a", "--tags", "x"}, words{"links", "/a"},
+          words{"changes"}, words{"attach", "key:a"}, words{"detach", "key:a"}}) {
+        words in_json = arguments;
+        in_json.emplace_back("--json");
+        const outcome ended = home.run(in_json);
+        EXPECT_EQ(ended.exit_status, 4) << testing::PrintToString(arguments);
+        EXPECT_EQ(nlohmann::json::parse(ended.out).at("error").at("kind"), "not_signed_in");
+    }
+}
+
+TEST_F(Usage, OfTheSampleFeedNeedsNothing)
+{
+    const outcome ended = home.run({"changes", "--sample", "--json"});
+
+    EXPECT_EQ(ended.exit_status, 0) << ended.err;
+    const auto document = nlohmann::json::parse(ended.out);
+    EXPECT_EQ(document.at("device_revision"), 59);
+    EXPECT_EQ(document.at("changes").size(), 17U);
+    EXPECT_EQ(document.at("changes").at(0).at("change"), "updated");
+    EXPECT_EQ(document.at("changes").at(16).at("kind"), "folder");
 }
 
 TEST_F(Usage, IsWrongInJsonToo)

@@ -106,7 +106,7 @@ CURLcode watched_setopt(CURL *handle, int number, ...)
     va_end(arguments);
     auto option = static_cast<CURLoption>(number);
     if (current && current->refused == option)
-        return CURLE_BAD_FUNCTION_ARGUMENT;
+        return current->refusal;
     if (current)
         note(option, value);
     if (option == CURLOPT_PORT && current && current->other_port != 0)

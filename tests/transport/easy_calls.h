@@ -28,6 +28,7 @@ public:
 
     size_t failing_inits = 0;                            // how many handles cannot be made at first
     CURLoption refused = CURLOPT_LASTENTRY;              // which option is refused
+    CURLcode refusal = CURLE_BAD_FUNCTION_ARGUMENT;      // and how
     std::function<CURLcode(size_t performance)> perform; // instead of a transfer, counted from 1
     CURLINFO refused_info = CURLINFO_NONE;               // what is not told of a handle
     long other_port = 0; // where a connection goes whose port is set; 0: to that port

@@ -31,11 +31,11 @@ std::string literally(const std::string &text)
     return pattern;
 }
 
-std::string failure_line(CURLcode code)
+std::string failure_line(CURLcode code, const char *said)
 {
     std::string start =
         "cUrl error: (" + std::to_string(code) + ") " + curl_easy_strerror(code) + ": ";
-    return literally(start) + "[^\n]+\n";
+    return literally(start) + said + "\n";
 }
 
 const char *const any_failure_line = "cUrl error: \\([0-9]+\\) [^\n]+: [^\n]+\n";

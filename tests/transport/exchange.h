@@ -35,7 +35,7 @@ std::string literally(const std::string &text);
 
 // Matches the log line of a transfer that failed with this code, whatever libcurl says about it, as
 // long as it says something.
-std::string failure_line(CURLcode code);
+std::string failure_line(CURLcode code, const char *said = "[^\n]+");
 
 // The same for a code that depends on which end of the connection notices first.
 extern const char *const any_failure_line;

@@ -46,9 +46,11 @@ TEST_F(ConnectionOptions, HavePort443AndTheCertificatesWithTls)
 
     EXPECT_THAT(calls.names(),
                 ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
-                            CURLOPT_PORT, CURLOPT_USE_SSL, CURLOPT_CAINFO, CURLOPT_CONNECT_ONLY));
+                            CURLOPT_PORT, CURLOPT_USE_SSL, CURLOPT_SSL_SESSIONID_CACHE,
+                            CURLOPT_CAINFO, CURLOPT_CONNECT_ONLY));
     EXPECT_EQ(calls.last(CURLOPT_PORT).number, 443);
     EXPECT_EQ(calls.last(CURLOPT_USE_SSL).number, 3);
+    EXPECT_EQ(calls.last(CURLOPT_SSL_SESSIONID_CACHE).number, 0);
     EXPECT_EQ(calls.last(CURLOPT_CAINFO).text, test_root_path());
 }
 
@@ -58,9 +60,10 @@ TEST_F(ConnectionOptions, LeaveTheHostNameVerifiedWithoutCertificates)
 
     open_connection(url, -1, 0);
 
-    EXPECT_THAT(calls.names(), ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL,
-                                           CURLOPT_TIMEOUT, CURLOPT_PORT, CURLOPT_USE_SSL,
-                                           CURLOPT_SSL_VERIFYPEER, CURLOPT_CONNECT_ONLY));
+    EXPECT_THAT(calls.names(),
+                ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
+                            CURLOPT_PORT, CURLOPT_USE_SSL, CURLOPT_SSL_SESSIONID_CACHE,
+                            CURLOPT_SSL_VERIFYPEER, CURLOPT_CONNECT_ONLY));
     EXPECT_EQ(calls.last(CURLOPT_SSL_VERIFYPEER).number, 0);
 }
 
@@ -74,7 +77,8 @@ TEST_F(ConnectionOptions, AreNotChangedByTheProxyAndSslDisabled)
 
     EXPECT_THAT(calls.names(),
                 ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
-                            CURLOPT_PORT, CURLOPT_USE_SSL, CURLOPT_CAINFO, CURLOPT_CONNECT_ONLY));
+                            CURLOPT_PORT, CURLOPT_USE_SSL, CURLOPT_SSL_SESSIONID_CACHE,
+                            CURLOPT_CAINFO, CURLOPT_CONNECT_ONLY));
 }
 
 struct timeout_case {
@@ -105,6 +109,18 @@ class ConnectionFailure : public ConnectionOptions {
 protected:
     stdout_capture output;
 };
+
+TEST_F(ConnectionFailure, IsALackOfMemoryForTheCertificates)
+{
+    calls.refused = CURLOPT_CAINFO; // libcurl would trust certificates of its own choice
+    calls.refusal = CURLE_OUT_OF_MEMORY;
+
+    opened result = open_connection(url, 1, 5);
+
+    EXPECT_EQ(result.result, -1);
+    EXPECT_EQ(calls.performances, 0u);
+    EXPECT_EQ(output.text(), "Curl error: Out of memory\n");
+}
 
 TEST_F(ConnectionFailure, OfTheHandleIsItsOwn)
 {

@@ -14,9 +14,10 @@ using testing::ElementsAre;
 
 constexpr const char *url = "http://service.example/a/path";
 
-// Redirects are restrained besides; redirect_test.cc says how.
-const std::vector<CURLoption> redirect_options = {CURLOPT_MAXREDIRS, CURLOPT_REDIR_PROTOCOLS_STR,
-                                                  CURLOPT_PREREQFUNCTION, CURLOPT_PREREQDATA};
+// Redirects are restrained besides; redirect_test.cc says how. And no TLS session is kept.
+const std::vector<CURLoption> further_options = {CURLOPT_MAXREDIRS, CURLOPT_REDIR_PROTOCOLS_STR,
+                                                 CURLOPT_PREREQFUNCTION, CURLOPT_PREREQDATA,
+                                                 CURLOPT_SSL_SESSIONID_CACHE};
 
 CURLcode succeed(size_t) { return CURLE_OK; }
 
@@ -31,7 +32,7 @@ TEST_F(TransferOptions, StandInTheirOrder)
 {
     fetch(url);
 
-    EXPECT_THAT(calls.names(redirect_options),
+    EXPECT_THAT(calls.names(further_options),
                 ElementsAre(CURLOPT_SHARE, CURLOPT_DNS_CACHE_TIMEOUT, CURLOPT_ERRORBUFFER,
                             CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
                             CURLOPT_NOPROGRESS, CURLOPT_CAINFO, CURLOPT_WRITEFUNCTION,
@@ -49,6 +50,7 @@ TEST_F(TransferOptions, HaveTheirValues)
     EXPECT_EQ(calls.last(CURLOPT_FOLLOWLOCATION).number, 1);
     EXPECT_EQ(calls.last(CURLOPT_NOSIGNAL).number, 1);
     EXPECT_EQ(calls.last(CURLOPT_NOPROGRESS).number, 1);
+    EXPECT_EQ(calls.last(CURLOPT_SSL_SESSIONID_CACHE).number, 0);
     EXPECT_EQ(calls.last(CURLOPT_CAINFO).text, test_root_path());
     EXPECT_EQ(calls.last(CURLOPT_WRITEFUNCTION).pointer,
               reinterpret_cast<const void *>(curl_write_function));
@@ -63,7 +65,7 @@ TEST_F(TransferOptions, StandInTheirOrderWithEverythingConfigured)
 
     fetch(url, post_of("body"));
 
-    EXPECT_THAT(calls.names(redirect_options),
+    EXPECT_THAT(calls.names(further_options),
                 ElementsAre(CURLOPT_SHARE, CURLOPT_DNS_CACHE_TIMEOUT, CURLOPT_ERRORBUFFER,
                             CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
                             CURLOPT_NOPROGRESS, CURLOPT_PROXY, CURLOPT_PROXYPORT,
@@ -255,6 +257,42 @@ INSTANTIATE_TEST_SUITE_P(Options, DispensableOption,
                          testing::Values(CURLOPT_SHARE, CURLOPT_DNS_CACHE_TIMEOUT, CURLOPT_TIMEOUT,
                                          CURLOPT_NOPROGRESS, CURLOPT_CAINFO));
 
+// Without the memory to keep one of these, a transfer would go past the proxy or trust the wrong
+// certificates.
+class ForgottenOption : public TransferOptions, public testing::WithParamInterface<CURLoption> {
+protected:
+    ForgottenOption()
+    {
+        set_user_proxy("proxy.example", 3128, "user", "password");
+        proxy_server.enabled = 1;
+        calls.refused = GetParam();
+        calls.refusal = CURLE_OUT_OF_MEMORY;
+    }
+};
+
+TEST_P(ForgottenOption, FailsAnAttemptBeforeItsTransfer)
+{
+    set_connection_attempts(2);
+
+    EXPECT_EQ(fetch(url).code, -1);
+
+    EXPECT_EQ(calls.performances, 0u);
+    EXPECT_EQ(calls.cleanups, 2u);
+    EXPECT_EQ(log.text(), "");
+}
+
+TEST_P(ForgottenOption, FailsBothProbesBeforeTheirTransfer)
+{
+    EXPECT_EQ(check_url_response_code(url, 1000), 0);
+    EXPECT_EQ(check_url_response(url, "q", "", 1000), 0);
+
+    EXPECT_EQ(calls.performances, 0u);
+}
+
+INSTANTIATE_TEST_SUITE_P(Options, ForgottenOption,
+                         testing::Values(CURLOPT_PROXY, CURLOPT_PROXYUSERNAME,
+                                         CURLOPT_PROXYPASSWORD, CURLOPT_CAINFO));
+
 class ProbeOptions : public TransferOptions {};
 
 TEST_F(ProbeOptions, OfTheStatusStandInTheirOrder)
@@ -263,7 +301,7 @@ TEST_F(ProbeOptions, OfTheStatusStandInTheirOrder)
 
     check_url_response_code(url, 1000);
 
-    EXPECT_THAT(calls.names(redirect_options),
+    EXPECT_THAT(calls.names(further_options),
                 ElementsAre(CURLOPT_SHARE, CURLOPT_DNS_CACHE_TIMEOUT, CURLOPT_ERRORBUFFER,
                             CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_NOBODY,
                             CURLOPT_TIMEOUT, CURLOPT_NOPROGRESS, CURLOPT_CAINFO));
@@ -282,7 +320,7 @@ TEST_F(ProbeOptions, OfTheBodyStandInTheirOrder)
 
     check_url_response(url, "q", "", 1000);
 
-    EXPECT_THAT(calls.names(redirect_options),
+    EXPECT_THAT(calls.names(further_options),
                 ElementsAre(CURLOPT_SHARE, CURLOPT_DNS_CACHE_TIMEOUT, CURLOPT_ERRORBUFFER,
                             CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
                             CURLOPT_WRITEFUNCTION, CURLOPT_WRITEDATA, CURLOPT_NOPROGRESS,
