@@ -300,7 +300,7 @@ TEST_F(FollowedChanges, EndWithWhatTheListingsShow)
     follower late(sessions[ann]); // asks but in the end, so that it has blocks to catch up
 
     int granted = 0;
-    for (int step = 1; granted < 3000; ++step) {
+    for (int step = 1; granted < QUILLMERE_CHANGES; ++step) {
         const bool is_ann = step % 3 != 0;
         granted += client.change(is_ann ? ann : bob, is_ann ? bob : ann) ? 1 : 0;
         if (step % 40 == 0) {

@@ -2,6 +2,7 @@
 // quillmere_exhausted CALL ALLOWED. Everything is released, for the case that the memory suffices.
 #include <sys/resource.h>
 
+#include <csignal>
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -11,9 +12,21 @@
 #include "quillmere.h"
 #include "runtime/tls_locks.h"
 
+#ifdef QUILLMERE_COUNT_COVERAGE
+extern "C" void __gcov_dump();
+#endif
+
 namespace {
 
 using quillmere_test::starved_heap;
+
+// What the counters of coverage have counted is written at a program's end, which an abort is not.
+void keep_counts_of_an_abort()
+{
+#ifdef QUILLMERE_COUNT_COVERAGE
+    std::signal(SIGABRT, [](int) { __gcov_dump(); });
+#endif
+}
 
 struct starved_call {
     const char *name;
@@ -139,6 +152,7 @@ int main(int count, char **arguments)
     // The abort is expected, and no core file of it wanted.
     const rlimit no_core = {0, 0};
     setrlimit(RLIMIT_CORE, &no_core);
+    keep_counts_of_an_abort();
     if (count != 3)
         return EXIT_FAILURE;
     for (const starved_call &call : calls)

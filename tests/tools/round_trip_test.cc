@@ -105,7 +105,7 @@ TEST_F(RoundTrip, KeepsNamesOfEveryKind)
 
 TEST_F(RoundTrip, KeepsManySmallFiles)
 {
-    constexpr int count = 2000;
+    constexpr int count = QUILLMERE_SMALL_FILES;
     constexpr std::chrono::minutes enough{4}; // each waits for the disk
     for (int number = 0; number < count; ++number)
         local("tree/" + std::to_string(number % 7) + "/" + std::to_string(number),
