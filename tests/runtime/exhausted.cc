@@ -24,7 +24,10 @@ using quillmere_test::starved_heap;
 void keep_counts_of_an_abort()
 {
 #ifdef QUILLMERE_COUNT_COVERAGE
-    std::signal(SIGABRT, [](int) { __gcov_dump(); });
+    std::signal(SIGABRT, [](int) {
+        const starved_heap plenty(SIZE_MAX); // writing takes memory
+        __gcov_dump();
+    });
 #endif
 }
 
