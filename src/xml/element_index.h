@@ -52,7 +52,7 @@ struct element_table {
     const element_row *rows;
     const uint8_t *buckets;
     uint32_t bucket_shift;
-    bool has_paths;
+    int32_t deepest_path; // the most elements in one, or 0 without any
 
     // The first row of this name, or no_row.
     uint8_t find(const element_name &name) const
@@ -108,7 +108,7 @@ public:
 
     constexpr element_table table() const
     {
-        return {rows_, buckets_, 32 - bucket_bits(), has_paths_};
+        return {rows_, buckets_, 32 - bucket_bits(), deepest_path_};
     }
 
 private:
@@ -130,18 +130,28 @@ private:
     constexpr void put_into_bucket(size_t row)
     {
         const element_name &name = rows_[row].name;
-        bool is_path = name.text[0] == '/';
-        if (name.length == 0 || (is_path && name.length > longest_path))
+        int32_t depth = depth_of(name);
+        if (name.length == 0 || (depth > 0 && name.length > longest_path))
             return;
         uint8_t &bucket = buckets_[name.hash >> (32 - bucket_bits())];
         rows_[row].next = bucket;
         bucket = static_cast<uint8_t>(row);
-        has_paths_ = has_paths_ || is_path;
+        if (depth > deepest_path_)
+            deepest_path_ = depth;
+    }
+
+    // No element's name has a slash in it.
+    static constexpr int32_t depth_of(const element_name &name)
+    {
+        int32_t depth = 0;
+        for (size_t at = 0; at < name.length; ++at)
+            depth += name.text[at] == '/' ? 1 : 0;
+        return depth;
     }
 
     element_row rows_[count] = {};
     uint8_t buckets_[size_t{1} << bucket_bits()] = {};
-    bool has_paths_ = false;
+    int32_t deepest_path_ = 0;
 };
 
 template <class... Rows, size_t... counts>

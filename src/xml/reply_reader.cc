@@ -46,22 +46,33 @@ bool reply_reader::read(const char *xml, uint64_t length)
 
 bool reply_reader::take(const char *element, heap_text *text)
 {
+    uint8_t row = untaken_row(element);
+    if (row == element_table::no_row)
+        return false;
+    lookups_[row].handed_out = true;
+    next_row_ = row + size_t{1};
+    text->reset(std::exchange(lookups_[row].found, nullptr));
+    return true;
+}
+
+uint8_t reply_reader::untaken_row(const char *element) const
+{
+    // Nearly always the elements are asked for in the order of their tables, by the very same text.
+    if (next_row_ < lookup_count_ && elements_.rows[next_row_].name.text == element &&
+        !lookups_[next_row_].handed_out)
+        return static_cast<uint8_t>(next_row_);
     const element_name name(element);
     uint8_t row = elements_.find(name);
     while (row != element_table::no_row && lookups_[row].handed_out)
         row = elements_.find_next(row, name);
-    if (row == element_table::no_row)
-        return false;
-    lookups_[row].handed_out = true;
-    text->reset(std::exchange(lookups_[row].found, nullptr));
-    return true;
+    return row;
 }
 
 void reply_reader::start(const char *element)
 {
     const element_name name(element);
     collect(name);
-    if (elements_.has_paths && path_.enter(name))
+    if (path_.enter(name, elements_.deepest_path))
         collect(path_.name());
     if (list_ && !list_->start(name))
         XML_StopParser(parser_, XML_FALSE);
@@ -71,8 +82,7 @@ void reply_reader::end(const char *element)
 {
     while (collecting_count_ > 0)
         lookups_[collecting_[--collecting_count_]].collecting = false;
-    if (elements_.has_paths)
-        path_.leave(element);
+    path_.leave(element, elements_.deepest_path);
     if (list_)
         list_->end(element);
 }
@@ -104,10 +114,10 @@ void reply_reader::discard()
         std::free(std::exchange(lookups_[row].found, nullptr));
 }
 
-bool reply_reader::open_path::enter(const element_name &element)
+bool reply_reader::open_path::enter(const element_name &element, int32_t deepest)
 {
     depth_ += 1;
-    if (depth_ == 1 || lost_at_ > 0)
+    if (depth_ == 0 || depth_ > deepest || lost_at_ >= 0)
         return false;
     if (length_ + 1 + element.length > longest_path) {
         lost_at_ = depth_;
@@ -119,11 +129,11 @@ bool reply_reader::open_path::enter(const element_name &element)
     return true;
 }
 
-void reply_reader::open_path::leave(const char *element)
+void reply_reader::open_path::leave(const char *element, int32_t deepest)
 {
     if (lost_at_ == depth_)
-        lost_at_ = 0;
-    else if (lost_at_ == 0 && depth_ > 1)
+        lost_at_ = -1;
+    else if (lost_at_ < 0 && depth_ > 0 && depth_ <= deepest)
         length_ -= 1 + std::strlen(element);
     depth_ -= 1;
 }

@@ -48,17 +48,18 @@ public:
     void text(const char *piece, int length);
 
 private:
-    // The path of the innermost open element.
+    // The path of the innermost open element, kept down to the depth of the deepest one sought.
     class open_path {
     public:
-        // False for the root, which has none, and for a path that is longer than any in a table.
-        bool enter(const element_name &element);
-        void leave(const char *element);
+        // False if the path cannot be one that is sought: the root has none, and others are too
+        // deep or too long.
+        bool enter(const element_name &element, int32_t deepest);
+        void leave(const char *element, int32_t deepest);
         element_name name() const { return {text_, length_}; }
 
     private:
-        int64_t depth_ = 0;
-        int64_t lost_at_ = 0; // depth from which on the path is too long, or 0
+        int64_t depth_ = -1;   // of the root's parent; the root's is 0
+        int64_t lost_at_ = -1; // depth from which on the path is too long, if it is
         size_t length_ = 0;
         char text_[longest_path];
     };
@@ -70,6 +71,7 @@ private:
         bool handed_out = false;
     };
 
+    uint8_t untaken_row(const char *element) const;
     void collect(const element_name &name);
     void discard();
 
@@ -81,6 +83,7 @@ private:
     lookup lookups_[most_lookups];
     uint8_t collecting_[most_lookups]; // the rows of those that do, in no order
     size_t collecting_count_ = 0;
+    size_t next_row_ = 0; // behind the one taken last
 };
 
 } // namespace quillmere
