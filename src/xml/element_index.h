@@ -24,7 +24,7 @@ constexpr uint32_t hash_of(const char *text, size_t length)
 
 // The name of an element, or its path below the root.
 struct element_name {
-    const char *text = "";
+    const char *text = nullptr;
     size_t length = 0;
     uint32_t hash = 0;
 
@@ -131,8 +131,10 @@ private:
     {
         const element_name &name = rows_[row].name;
         int32_t depth = depth_of(name);
-        if (name.length == 0 || (depth > 0 && name.length > longest_path))
+        if (name.length == 0 || (depth > 0 && name.length > longest_path)) {
+            rows_[row].name = {}; // so that nobody takes it for one that is found
             return;
+        }
         uint8_t &bucket = buckets_[name.hash >> (32 - bucket_bits())];
         rows_[row].next = bucket;
         bucket = static_cast<uint8_t>(row);
