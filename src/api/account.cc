@@ -76,6 +76,14 @@ constexpr element_field<user_limits> limits_elements[] = {
     {"upload_size_limit", &user_limits::upload_size_limit},
 };
 
+constexpr const char *revision_elements[] = {"revision", "epoch"};
+
+// The details of a linked account may be asked for, so they are expected.
+constexpr auto user_reply = index_of(standard_elements, profile_elements, facebook_elements,
+                                     twitter_link_elements, twitter_elements);
+constexpr auto limits_reply = index_of(standard_elements, limits_elements);
+constexpr auto revision_reply = index_of(standard_elements, revision_elements);
+
 // The details of a social account are only looked up when it is linked: the service may send
 // leftovers of one that was.
 owned_record<user_info> user_info_of(api_call &call)
@@ -99,6 +107,7 @@ int32_t get_user_info(const char *session_token, user_info **info, char **error_
     call.plain("?session_token=", session_token);
     call.version();
 
+    call.expect(user_reply);
     call.fetch("get user  url: ", reply_log::text); // two blanks, deliberately
     if (call.accepted())
         *info = user_info_of(call).release();
@@ -112,6 +121,7 @@ int32_t get_user_limits(const char *session_token, user_limits **limits, char **
     call.plain("?session_token=", session_token);
     call.version();
 
+    call.expect(limits_reply);
     call.fetch("get user limits url: ", reply_log::text);
     if (call.accepted())
         *limits = call.record_of(limits_elements).release();
@@ -127,6 +137,7 @@ int32_t get_myfiles_revision(const char *session_token, char **revision, char **
     call.plain("?session_token=", session_token);
     call.version();
 
+    call.expect(revision_reply);
     call.fetch(nullptr, reply_log::none);
     if (call.accepted(error_reading::standard, exchange_verdict::silent_unless_zero)) {
         *revision = call.text_of("revision").release();

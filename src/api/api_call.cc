@@ -7,6 +7,13 @@
 
 namespace quillmere {
 
+namespace {
+
+constexpr auto standard_reply = index_of(standard_elements);
+constexpr auto direct_reply = index_of(direct_elements);
+
+} // namespace
+
 api_call::api_call(const char *path, char **error_message)
     : url_(string_new(256)), error_message_(error_message)
 {
@@ -80,6 +87,8 @@ void api_call::log_reply(reply_log log) const
 
 bool api_call::accepted(error_reading reading, exchange_verdict verdict)
 {
+    if (!reader_.expects())
+        reader_.expect(reading == error_reading::direct ? direct_reply : standard_reply);
     heap_text result = text_of("result");
     if (!result) {
         failed_exchange(verdict);
@@ -95,10 +104,20 @@ bool api_call::accepted(error_reading reading, exchange_verdict verdict)
 
 heap_text api_call::text_of(const char *element)
 {
+    heap_text text;
+    if (read_in_one_pass() && reader_.take(element, &text))
+        return text;
     int32_t parse_failed = 0;
-    heap_text text(simple_get_xml_node_value(reply_.get(), reply_length_, element, &parse_failed));
+    text.reset(simple_get_xml_node_value(reply_.get(), reply_length_, element, &parse_failed));
     parse_failures_ += static_cast<uint32_t>(parse_failed);
     return text;
+}
+
+bool api_call::read_in_one_pass()
+{
+    if (one_pass_ == one_pass::untried)
+        one_pass_ = reader_.read(reply_.get(), reply_length_) ? one_pass::whole : one_pass::failed;
+    return one_pass_ == one_pass::whole;
 }
 
 heap_text api_call::required_text_of(const char *element)
@@ -112,18 +131,21 @@ heap_text api_call::required_text_of(const char *element)
 void api_call::refused(error_reading reading)
 {
     if (reading == error_reading::direct)
-        read_error_directly();
+        read_error("error", "message", QM_NO_ERROR_ELEMENT);
+    else if (one_pass_ == one_pass::whole)
+        read_error("/error", "/message", QM_UNUSABLE_ERROR_NUMBER);
     else
         get_error_from_xml(reply_.get(), reply_length_, &status_, error_message_);
     if (check_api_error)
         check_api_error(string_get(url_.get()), reply_.get(), status_, *error_message_);
 }
 
-void api_call::read_error_directly()
+void api_call::read_error(const char *number_element, const char *message_element,
+                          int32_t without_number)
 {
-    heap_text number = text_of("error");
-    status_ = number ? error_number_in(number.get()) : QM_NO_ERROR_ELEMENT;
-    *error_message_ = text_of("message").release();
+    heap_text number = text_of(number_element);
+    status_ = number ? error_number_in(number.get()) : without_number;
+    *error_message_ = text_of(message_element).release();
 }
 
 void api_call::failed_exchange(exchange_verdict verdict)

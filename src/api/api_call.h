@@ -8,6 +8,7 @@
 #include "owned.h"
 #include "records/elements.h"
 #include "records/records.h"
+#include "xml/reply_reader.h"
 
 namespace quillmere {
 
@@ -34,6 +35,10 @@ enum class error_reading {
     direct    // by the names of the elements, and a missing number is -1
 };
 
+// What every reply is asked for, by the way in which errors are read.
+inline constexpr const char *standard_elements[] = {"result", "/error", "/message"};
+inline constexpr const char *direct_elements[] = {"result", "error", "message"};
+
 class api_call {
 public:
     // Starts the URL with the TLS base and the path, and resets the error message.
@@ -47,6 +52,15 @@ public:
     void secret(const char *key, const char *value); // encoded, and left out of the log
     void number(const char *key, uint64_t value);
     void version();
+
+    // What an operation looks up, and which list it extracts. All of that is read in one pass over
+    // the reply, as long as nothing is wrong with the reply; whatever is not expected, or is asked
+    // for again, costs a pass of its own. An operation that expects nothing still expects a result.
+    template <size_t count>
+    void expect(const element_index<count> &elements, list_extraction *list = nullptr)
+    {
+        reader_.expect(elements, list);
+    }
 
     // Logs the URL behind a heading (null: not at all), performs the exchange and logs the reply.
     void fetch(const char *url_heading, reply_log log);
@@ -99,16 +113,25 @@ public:
     int32_t status() const { return malformed() ? QM_MALFORMED_REPLY : status_; }
 
 private:
+    // Whether the reply has been read in one pass, which the first question tries. If not, lookups
+    // and extractors read it one by one: only they tell what is wrong with it, in the log and by
+    // what they find before it.
+    enum class one_pass { untried, whole, failed };
+
     void log_url(const char *heading);
     void log_reply(reply_log log) const;
+    bool read_in_one_pass();
     void refused(error_reading reading);
-    void read_error_directly();
+    void read_error(const char *number_element, const char *message_element,
+                    int32_t without_number);
     void failed_exchange(exchange_verdict verdict);
 
     owned_buffer url_;
     char **error_message_;
     heap_text reply_;
     uint64_t reply_length_ = 0;
+    reply_reader reader_;
+    one_pass one_pass_ = one_pass::untried;
     int64_t response_code_ = 0;
     uint32_t parse_failures_ = 0;
     int32_t status_ = -1;

@@ -14,6 +14,12 @@ const char *renew_session_token_uri = "/api/user/renew_session_token.php";
 
 namespace {
 
+constexpr const char *session_elements[] = {"session_token"};
+constexpr const char *login_elements[] = {"pkey", "login_token"};
+
+constexpr auto session_reply = index_of(standard_elements, session_elements);
+constexpr auto login_reply = index_of(standard_elements, login_elements);
+
 // SHA-1 of the pieces, joined without separators. The pieces enter unencoded, whatever the URL
 // makes of them.
 class request_signature {
@@ -60,6 +66,7 @@ int32_t get_session_token(const char *email, const char *password, const char *f
     call.secret("&signature=", signature.digits());
     call.version();
 
+    call.expect(session_reply);
     call.fetch("Session token url:\n", reply_log::text_and_length);
     if (call.accepted())
         *session_token_or_error = call.required_text_of("session_token").release();
@@ -81,6 +88,7 @@ int32_t get_login_token(const char *email, const char *password, const char *app
     call.secret("&signature=", signature.digits());
     call.version();
 
+    call.expect(login_reply);
     call.fetch("get_login_token url:\n", reply_log::none);
     // Before the result is known, deliberately: a refusal may carry a pkey too.
     if (call.has_reply())
@@ -102,6 +110,7 @@ int32_t renew_session_token(const char *session_token, char **session_token_or_e
     call.plain("?session_token=", session_token);
     call.version();
 
+    call.expect(session_reply);
     call.fetch(nullptr, reply_log::text_and_int_length);
     if (call.accepted(error_reading::standard, exchange_verdict::silent))
         *session_token_or_error = call.required_text_of("session_token").release();

@@ -11,6 +11,12 @@ namespace {
 
 constexpr char url_heading[] = "get_changes url: ";
 
+constexpr const char *feed_elements[] = {"device_revision", "changes_list_block"};
+constexpr const char *sample_elements[] = {"device_revision", "recent_changes_limit"};
+
+constexpr auto feed_reply = index_of(standard_elements, feed_elements);
+constexpr auto sample_reply = index_of(standard_elements, sample_elements);
+
 // What the feed and its sample have in common.
 struct change_feed {
     uint64_t *device_revision;
@@ -26,11 +32,10 @@ struct change_feed {
         *block_size = 0;
     }
 
-    void read(api_call &call, const char *block_size_element) const
+    void read(api_call &call, changes_extraction &entries, const char *block_size_element) const
     {
         *changes = change_list_new();
-        call.extracted(
-            simple_extract_changes(call.reply(), call.reply_length(), *changes, change_count));
+        call.extracted(entries.extract(call.reply(), call.reply_length(), *changes, change_count));
         if (heap_text revision = call.text_of("device_revision"))
             *device_revision = uint64_in(revision.get());
         if (heap_text size = call.text_of(block_size_element))
@@ -60,9 +65,11 @@ int32_t get_device_changes(const char *session_token, uint64_t revision, uint32_
     api_call call(get_device_changes_uri, error_message);
     changes_query(call, session_token, revision, device_id);
 
+    changes_extraction entries;
+    call.expect(feed_reply, &entries);
     call.fetch(url_heading, reply_log::text);
     if (call.accepted())
-        feed.read(call, "changes_list_block");
+        feed.read(call, entries, "changes_list_block");
     return call.status();
 }
 
@@ -75,8 +82,11 @@ int32_t test_get_device_changes(const char *session_token, uint64_t revision, ui
     api_call call(get_device_changes_uri, error_message);
     changes_query(call, session_token, revision, device_id);
 
+    changes_extraction entries;
+    call.expect(sample_reply, &entries);
     call.pretend(url_heading, sample_changes, sizeof sample_changes - 1);
     if (call.accepted())
-        feed.read(call, "recent_changes_limit"); // which the sample does not have, deliberately
+        feed.read(call, entries,
+                  "recent_changes_limit"); // which the sample does not have, deliberately
     return call.status();
 }

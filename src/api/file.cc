@@ -33,6 +33,13 @@ constexpr element_field<file_info> file_elements[] = {
     {"/file_info/permissions", &file_info::permissions},
 };
 
+constexpr const char *created_elements[] = {"quickkey"};
+constexpr const char *copied_elements[] = {"new_quickkey"};
+
+constexpr auto file_reply = index_of(standard_elements, file_elements);
+constexpr auto created_reply = index_of(standard_elements, created_elements);
+constexpr auto copied_reply = index_of(standard_elements, copied_elements);
+
 } // namespace
 
 int32_t get_file_info(const char *quick_key, const char *session_token, char **error_message,
@@ -45,6 +52,7 @@ int32_t get_file_info(const char *quick_key, const char *session_token, char **e
         call.plain("&session_token=", session_token);
     call.version();
 
+    call.expect(file_reply);
     call.fetch("\nget_file_info url text:\n", reply_log::text_and_length);
     if (call.accepted())
         *info = call.record_of(file_elements).release();
@@ -68,6 +76,7 @@ int32_t create_file(const char *session_token, const char *filename, const char 
         call.encoded("&mtime=", mtime);
     call.version();
 
+    call.expect(created_reply);
     call.fetch("create_file: url: ", reply_log::response);
     if (call.accepted())
         *quick_key = call.text_of("quickkey").release();
@@ -99,6 +108,7 @@ int32_t copy_file(const char *session_token, const char *quick_key, const char *
         call.encoded("&folder_key=", folder_key);
     call.version();
 
+    call.expect(copied_reply);
     call.fetch("copy_file: url: ", reply_log::response);
     if (call.accepted())
         *new_quick_key = call.text_of("new_quickkey").release();

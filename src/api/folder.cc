@@ -39,6 +39,13 @@ constexpr element_field<folder_info> folder_elements[] = {
     {"/folder_info/byte_count", &folder_info::byte_count},
 };
 
+constexpr const char *created_elements[] = {"folder_key"};
+constexpr const char *copied_elements[] = {"new_folderkey"};
+
+constexpr auto folder_reply = index_of(direct_elements, folder_elements);
+constexpr auto created_reply = index_of(standard_elements, created_elements);
+constexpr auto copied_reply = index_of(direct_elements, copied_elements);
+
 // What update_folder() takes for a privacy; anything else leaves the folder's as it is.
 constexpr int32_t make_public = -1;
 constexpr int32_t make_private = 1;
@@ -74,6 +81,7 @@ int32_t get_folder_info(const char *session_token, const char *folder_key, const
     led_parameter(call, "details=", given(details) ? details : "yes");
     call.plain("version=", api_version);
 
+    call.expect(folder_reply);
     call.fetch("\nget_folder_info url text:\n", reply_log::text_and_length);
     if (call.accepted(error_reading::direct))
         *info = call.record_of(folder_elements).release();
@@ -94,6 +102,7 @@ int32_t create_folder(const char *session_token, const char *name, const char *p
     call.text("&allow_duplicate_name=no");
     call.version();
 
+    call.expect(created_reply);
     call.fetch("create_folder: url: ", reply_log::response);
     if (call.accepted())
         *folder_key = call.text_of("folder_key").release();
@@ -149,6 +158,7 @@ int32_t copy_folder(const char *session_token, const char *source_key, const cha
         call.plain("&folder_key_dst=", destination_key);
     call.version();
 
+    call.expect(copied_reply);
     call.fetch("copy_folder url:\n", reply_log::text_and_length);
     if (call.accepted(error_reading::direct))
         *new_folder_key = call.text_of("new_folderkey").release();

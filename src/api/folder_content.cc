@@ -13,6 +13,10 @@ namespace {
 
 constexpr int32_t usual_chunk_size = 100;
 
+constexpr const char *chunk_elements[] = {"chunk_size"};
+
+constexpr auto content_reply = index_of(direct_elements, chunk_elements);
+
 // With neither a token nor a key the query starts with "&" and has no "?", deliberately.
 void content_query(api_call &call, const char *session_token, const char *folder_key,
                    const char *device_id, const char *chunk, const char *content_type)
@@ -61,14 +65,16 @@ int32_t get_folder_content(const char *session_token, const char *folder_key, co
     qm_printf("Quillmere API: get_folder_content\n");
     content_query(call, session_token, folder_key, device_id, chunk, content_type);
 
+    folder_content_extraction content;
+    call.expect(content_reply, &content);
     call.fetch("get_folder_content url:\n", reply_log::text_and_length);
     if (call.accepted(error_reading::direct)) {
         heap_text size = call.text_of("chunk_size");
         *chunk_size = size ? int32_in(size.get()) : usual_chunk_size;
         *files = file_info_list_new();
         *folders = folder_info_list_new();
-        call.extracted(simple_extract_folders_content(call.reply(), call.reply_length(), *folders,
-                                                      folder_count, *files, file_count));
+        call.extracted(content.extract(call.reply(), call.reply_length(), *folders, folder_count,
+                                       *files, file_count));
         qm_printf("get_folder_content Success\n");
     }
     if (*folder_count == 0 || call.malformed()) {

@@ -7,6 +7,20 @@ using namespace quillmere;
 const char *get_links_uri = "/api/file/get_links.php";
 const char *get_download_link_uri = "/api/file/get_links.php";
 
+namespace {
+
+constexpr const char *download_elements[] = {
+    "direct_download",
+    "direct_download_free_bandwidth",
+    "direct_download_error",
+    "direct_download_error_message",
+};
+
+constexpr auto links_reply = index_of(standard_elements);
+constexpr auto download_reply = index_of(standard_elements, download_elements);
+
+} // namespace
+
 int32_t get_links(const char *quick_key, const char *link_type, const char *session_token,
                   file_links_list **links, int32_t *link_count, char **error_message)
 {
@@ -20,11 +34,12 @@ int32_t get_links(const char *quick_key, const char *link_type, const char *sess
         call.plain("&session_token=", session_token);
     call.version();
 
+    links_extraction found;
+    call.expect(links_reply, &found);
     call.fetch("get_links url: ", reply_log::text);
     if (call.accepted()) {
         *links = file_links_list_new();
-        call.extracted(
-            simple_extract_file_links(call.reply(), call.reply_length(), *links, link_count));
+        call.extracted(found.extract(call.reply(), call.reply_length(), *links, link_count));
         qm_printf("get_links Success\n");
     }
     if (*link_count == 0 || call.malformed()) {
@@ -48,6 +63,7 @@ int32_t get_download_link(const char *session_token, const char *quick_key, char
     call.text("&link_type=direct_download");
     call.version();
 
+    call.expect(download_reply);
     call.fetch("get_download_link url: ", reply_log::text);
     if (call.accepted()) {
         *download_url = normalize_url(call.text_of("direct_download").get(), "http");

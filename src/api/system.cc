@@ -28,6 +28,12 @@ constexpr element_field<system_status> status_elements[] = {
     {"memcache", &system_status::memcache},
 };
 
+constexpr const char *device_elements[] = {"device_revision", "async_jobs_in_progress"};
+
+constexpr auto limits_reply = index_of(standard_elements, limits_elements);
+constexpr auto status_reply = index_of(standard_elements, status_elements);
+constexpr auto device_reply = index_of(standard_elements, device_elements);
+
 } // namespace
 
 int32_t get_system_limits(system_limits **limits, char **error_message)
@@ -35,6 +41,7 @@ int32_t get_system_limits(system_limits **limits, char **error_message)
     *limits = nullptr;
     api_call call(get_system_limits_uri, error_message);
 
+    call.expect(limits_reply);
     call.fetch("get_system_limits url: ", reply_log::text);
     if (call.accepted())
         *limits = call.record_of(limits_elements).release();
@@ -46,6 +53,7 @@ int32_t get_system_status(system_status **status, char **error_message)
     *status = nullptr;
     api_call call(get_system_status_uri, error_message);
 
+    call.expect(status_reply);
     call.fetch("get_system_status url: ", reply_log::text);
     if (call.accepted())
         *status = call.record_of(status_elements).release();
@@ -62,6 +70,7 @@ int32_t get_device_status(const char *session_token, uint32_t device_id, uint64_
     call.number("&device_id=", device_id);
     call.version();
 
+    call.expect(device_reply);
     call.fetch("get_status url: ", reply_log::text);
     if (call.accepted()) {
         if (heap_text revision = call.text_of("device_revision"))

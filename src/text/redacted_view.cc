@@ -13,12 +13,12 @@ namespace quillmere {
 
 namespace {
 
-// How many ranges cover each byte, kept as differences: the table holds +1 where a range starts and
-// -1 where it ends. So the cost is that of the text plus that of the ranges, however much these
-// overlap.
-using cover_table = std::unique_ptr<int32_t, releaser<free_memory>>;
+// Where the longest of the ranges that start at a byte ends, for every byte; 0 where none starts.
+// So the cost is that of the text plus that of the ranges, whatever their order and however much
+// they overlap.
+using end_table = std::unique_ptr<int32_t, releaser<free_memory>>;
 
-void add_range(int32_t *covers, uint64_t length, const redaction_range &range)
+void add_range(int32_t *ends, uint64_t length, const redaction_range &range)
 {
     // Indices count as signed 32-bit numbers, deliberately: a range that ends at -1 hides nothing.
     auto start = static_cast<int32_t>(range.start);
@@ -28,56 +28,46 @@ void add_range(int32_t *covers, uint64_t length, const redaction_range &range)
     auto first = static_cast<uint64_t>(static_cast<int64_t>(start));
     if (first >= length || start == end)
         return;
-    auto last = static_cast<uint64_t>(end);
-    covers[first] += 1;
-    covers[last < length ? last : length] -= 1;
+    ends[first] = std::max(ends[first], end);
 }
 
-cover_table covers_of(const string_buffer &buffer)
+end_table ends_of(const string_buffer &buffer)
 {
-    // One entry more than there are bytes, for the ranges that end with the text.
-    uint64_t entries = buffer.length + 1;
-    if (entries > UINT64_MAX / sizeof(int32_t))
+    if (buffer.length >= UINT64_MAX / sizeof(int32_t))
         out_of_memory();
-    cover_table covers(static_cast<int32_t *>(allocate_zeroed(entries * sizeof(int32_t))));
+    end_table ends(static_cast<int32_t *>(allocate_zeroed((buffer.length + 1) * sizeof(int32_t))));
     for (const redaction_range *range = buffer.redaction_ranges; range; range = range->next)
-        add_range(covers.get(), buffer.length, *range);
-    return covers;
+        add_range(ends.get(), buffer.length, *range);
+    return ends;
 }
 
-// Calls visit(index, hidden, first) for every byte; first tells a run's first hidden byte from the
-// rest of it.
-template <class Visitor> void walk(const int32_t *covers, uint64_t length, const Visitor &visit)
+// Behind the last byte that is hidden by the ranges at start and by all that overlap or touch.
+uint64_t end_of_run(const int32_t *ends, uint64_t length, uint64_t start)
 {
-    int32_t depth = 0;
-    bool hidden_before = false;
-    for (uint64_t index = 0; index < length; ++index) {
-        depth += covers[index];
-        bool hidden = depth > 0;
-        visit(index, hidden, hidden && !hidden_before);
-        hidden_before = hidden;
-    }
+    auto end = static_cast<uint64_t>(ends[start]);
+    for (uint64_t index = start + 1; index <= end && index < length; ++index)
+        end = std::max(end, static_cast<uint64_t>(ends[index]));
+    return std::min(end, length);
 }
 
-heap_text redacted(const string_buffer &buffer, const char *marker)
+owned_buffer redacted(const string_buffer &buffer, const char *marker)
 {
-    cover_table covers = covers_of(buffer);
+    uint64_t length = buffer.length;
     uint64_t marker_length = std::strlen(marker);
+    end_table ends = ends_of(buffer);
+    owned_buffer view(string_new(length + 1));
 
-    uint64_t length = 0;
-    walk(covers.get(), buffer.length, [&](uint64_t, bool hidden, bool first) {
-        length += first ? marker_length : (hidden ? 0 : 1);
-    });
-
-    heap_text view(static_cast<char *>(allocate_zeroed(length + 1)));
-    char *out = view.get();
-    walk(covers.get(), buffer.length, [&](uint64_t index, bool hidden, bool first) {
-        if (first) {
-            out = std::copy_n(marker, marker_length, out);
-        } else if (!hidden) {
-            *out++ = buffer.bytes[index];
-        }
-    });
+    uint64_t shown = 0; // all before it is in the view
+    for (uint64_t index = 0; index < length; ++index) {
+        if (ends.get()[index] == 0)
+            continue;
+        string_append_len(view.get(), buffer.bytes + shown, index - shown);
+        string_append_len(view.get(), marker, marker_length);
+        shown = end_of_run(ends.get(), length, index);
+        index = shown; // where no range starts, or the run would go on
+    }
+    if (shown < length)
+        string_append_len(view.get(), buffer.bytes + shown, length - shown);
     return view;
 }
 
@@ -93,6 +83,7 @@ const char *string_get_obfs(string_buffer *buffer, const char *replacement)
         return buffer->bytes;
 
     std::free(std::exchange(buffer->redacted_copy, nullptr));
-    buffer->redacted_copy = redacted(*buffer, replacement ? replacement : "(omitted)").release();
+    owned_buffer view = redacted(*buffer, replacement ? replacement : "(omitted)");
+    buffer->redacted_copy = std::exchange(view->bytes, nullptr);
     return buffer->redacted_copy;
 }

@@ -2,6 +2,7 @@
 #include <utility>
 
 #include "xml/extractor.h"
+#include "xml/list_extraction.h"
 
 namespace quillmere {
 
@@ -55,6 +56,9 @@ constexpr element_field<file_info> file_elements[] = {
     {"permissions", &file_info::permissions},
 };
 
+constexpr auto folder_index = index_of(folder_elements);
+constexpr auto file_index = index_of(file_elements);
+
 // The public state comes first, so that the exported callbacks can take the whole for it.
 struct extraction {
     folder_content_state state;
@@ -105,7 +109,64 @@ void release_open_records(folder_content_state &state)
     file_info_delete(&state.current_file);
 }
 
+void log_counts(int32_t folder_count, int32_t file_count)
+{
+    qm_printf("xml extract: folder size: %d, file size: %d\n", folder_count, file_count);
+}
+
 } // namespace
+
+uint32_t folder_content_extraction::extract(const char *xml, uint64_t length, folder_list *folders,
+                                            int32_t *folder_count, file_list *files,
+                                            int32_t *file_count)
+{
+    if (!whole())
+        return simple_extract_folders_content(xml, length, folders, folder_count, files,
+                                              file_count);
+    log_counts(folders_.count(), files_.count());
+    *folder_count = folders_.count();
+    *file_count = files_.count();
+    folders_.move_to(folders);
+    files_.move_to(files);
+    return 0;
+}
+
+bool folder_content_extraction::start(const element_name &element)
+{
+    target_ = {};
+    if (is(element.text, "folder")) {
+        folder_ = new_record<folder_info>();
+        place_ = place::folder;
+    } else if (is(element.text, "file")) {
+        file_ = new_record<file_info>();
+        place_ = place::file;
+    } else if (place_ == place::folder && folder_) {
+        target_ = text_target_of(*folder_, folder_elements, folder_index, folder_texts_, element);
+    } else if (place_ == place::file && file_) {
+        target_ = text_target_of(*file_, file_elements, file_index, file_texts_, element);
+    }
+    return true;
+}
+
+void folder_content_extraction::end(const char *element)
+{
+    target_ = {};
+    if (is(element, "folder"))
+        folders_.add(std::move(folder_));
+    else if (is(element, "file"))
+        files_.add(std::move(file_));
+    else
+        return;
+    place_ = place::outside;
+}
+
+void folder_content_extraction::discard()
+{
+    folders_.clear();
+    files_.clear();
+    folder_.reset();
+    file_.reset();
+}
 
 } // namespace quillmere
 
@@ -126,8 +187,7 @@ uint32_t simple_extract_folders_content(const char *xml, uint64_t length, folder
                                        simple_extract_folders_node_value_end, extract_text});
     XML_Status status = parse_document(parser, xml, length);
 
-    qm_printf("xml extract: folder size: %d, file size: %d\n", running.state.folder_count,
-              running.state.file_count);
+    log_counts(running.state.folder_count, running.state.file_count);
     *folder_count = running.state.folder_count;
     *file_count = running.state.file_count;
     release_open_records(running.state);

@@ -2,6 +2,7 @@
 #include <utility>
 
 #include "xml/extractor.h"
+#include "xml/list_extraction.h"
 
 namespace quillmere {
 
@@ -23,6 +24,8 @@ constexpr element_field<file_links> link_elements[] = {
     {"error", &file_links::error},
 };
 
+constexpr auto link_index = index_of(link_elements);
+
 // The public state comes first, so that the exported callbacks can take the whole for it.
 struct extraction {
     links_state state;
@@ -43,7 +46,11 @@ void extract_text(void *user_data, const char *text, int length)
     add_text(running->state, running->texts, text, length);
 }
 
-// In a damaged document an end tag may find no record open.
+void log_link() { qm_printf("xml extract: found link\n"); }
+
+void log_count(int32_t link_count) { qm_printf("xml extract: num_file_links %d\n", link_count); }
+
+// An end tag may find no record open.
 void finish_link(links_state &state)
 {
     if (!state.current_link)
@@ -51,10 +58,46 @@ void finish_link(links_state &state)
     add_to_file_links_list(state.links, std::exchange(state.current_link, nullptr));
     state.link_count += 1;
     state.in_link = 0;
-    qm_printf("xml extract: found link\n");
+    log_link();
 }
 
 } // namespace
+
+uint32_t links_extraction::extract(const char *xml, uint64_t length, file_links_list *links,
+                                   int32_t *link_count)
+{
+    if (!whole())
+        return simple_extract_file_links(xml, length, links, link_count);
+    for (int32_t link = 0; link < links_.count(); ++link)
+        log_link();
+    log_count(links_.count());
+    *link_count = links_.count();
+    links_.move_to(links);
+    return 0;
+}
+
+bool links_extraction::start(const element_name &element)
+{
+    target_ = {};
+    if (is(element.text, "link"))
+        link_ = new_record<file_links>();
+    else if (link_)
+        target_ = text_target_of(*link_, link_elements, link_index, texts_, element);
+    return true;
+}
+
+void links_extraction::end(const char *element)
+{
+    target_ = {};
+    if (is(element, "link"))
+        links_.add(std::move(link_));
+}
+
+void links_extraction::discard()
+{
+    links_.clear();
+    link_.reset();
+}
 
 } // namespace quillmere
 
@@ -73,7 +116,7 @@ uint32_t simple_extract_file_links(const char *xml, uint64_t length, file_links_
                                        simple_extract_links_node_value_end, extract_text});
     XML_Status status = parse_document(parser, xml, length);
 
-    qm_printf("xml extract: num_file_links %d\n", running.state.link_count);
+    log_count(running.state.link_count);
     *link_count = running.state.link_count;
     forget_element(&running.state.current_element);
     file_links_delete(&running.state.current_link);
