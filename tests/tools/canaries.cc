@@ -3,7 +3,6 @@
 #include <cctype>
 #include <filesystem>
 #include <fstream>
-#include <iterator>
 #include <sstream>
 
 #include <quillmere.h>
@@ -30,8 +29,10 @@ std::string percent_encoded(const std::string &text, const char *digits)
 /** What a file holds; nothing when it cannot be read, as one of a process that has just ended. */
 std::string bytes_of(const fs::path &path)
 {
-    std::ifstream file(path, std::ios::binary);
-    return {std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
+    const std::ifstream file(path, std::ios::binary);
+    std::ostringstream bytes;
+    bytes << file.rdbuf(); // which takes a failure for the end
+    return bytes.str();
 }
 
 std::vector<pid_t> all_processes()
