@@ -1,5 +1,8 @@
 #include "session_file.h"
 
+#include <algorithm>
+#include <string_view>
+
 #include <nlohmann/json.hpp>
 
 #include "console.h"
@@ -18,6 +21,17 @@ std::string text_of(const nlohmann::json &document, const char *key)
     return found != document.end() && found->is_string() ? found->get<std::string>() : "";
 }
 
+// A token goes into addresses as it is. One with a letter that ends it there would be another token
+// for the service, and what is behind the letter would not be taken for a secret in the log.
+bool can_be_sent(const std::string &token)
+{
+    return std::none_of(token.begin(), token.end(), [](char letter) {
+        const auto byte = static_cast<unsigned char>(letter);
+        return byte <= ' ' || byte == 0x7f ||
+               std::string_view("&#\"'<>").find(letter) != std::string_view::npos;
+    });
+}
+
 session read_session(const std::string &text, const std::string &path)
 {
     const nlohmann::json document = nlohmann::json::parse(text, nullptr, false);
@@ -27,7 +41,7 @@ session read_session(const std::string &text, const std::string &path)
         current.email = text_of(document, "email");
         current.token = text_of(document, "session_token");
     }
-    if (current.service.empty() || current.token.empty())
+    if (current.service.empty() || current.token.empty() || !can_be_sent(current.token))
         throw failure(exit_code::local_file, std::string(what) + " " + path + " is damaged",
                       "sign in again with: quillmere login");
     return current;
@@ -53,6 +67,8 @@ std::optional<session> session_file::load() const
 
 void session_file::save(const session &current) const
 {
+    if (!can_be_sent(current.token))
+        throw failure(exit_code::unreadable_answer, "the service gave a token that cannot be sent");
     const nlohmann::ordered_json document = {
         {"service", current.service}, {"email", current.email}, {"session_token", current.token}};
     // Bytes that are no UTF-8 cannot stand in JSON, and a token with other bytes is another token.

@@ -3,6 +3,9 @@
 
 #include <curl/curl.h>
 
+#include <unistd.h>
+
+#include <atomic>
 #include <memory>
 #include <string>
 #include <thread>
@@ -11,6 +14,7 @@
 #include "quillmere.h"
 #include "support/library_fixture.h"
 #include "support/log_capture.h"
+#include "support/temporary_folder.h"
 
 namespace quillmere_test {
 namespace {
@@ -98,6 +102,38 @@ TEST_P(LockedKind, IsHeldByOneThreadAtATimeWhateverTheAccess)
     shared.join();
 
     EXPECT_EQ(counter, 2 * rounds);
+}
+
+// Whether a thread of this process waits for something.
+bool waits(pid_t thread)
+{
+    const std::string path = "/proc/self/task/" + std::to_string(thread) + "/stat";
+    const std::string facts = content_of(path);
+    return facts.compare(facts.rfind(')'), 3, ") S") == 0;
+}
+
+TEST_P(LockedKind, MakesAnotherThreadWait)
+{
+    std::atomic<pid_t> other{0};
+    std::atomic<bool> released{false}, had_it_early{false}, done{false};
+    lock(GetParam());
+
+    std::thread wants_it([&] {
+        other = ::gettid();
+        lock(GetParam());
+        had_it_early = !released;
+        unlock(GetParam());
+        done = true;
+        while (!released)
+            std::this_thread::yield();
+    });
+    while (other == 0 || (!done && !waits(other)))
+        std::this_thread::yield();
+    released = true;
+    unlock(GetParam());
+    wants_it.join();
+
+    EXPECT_FALSE(had_it_early);
 }
 
 INSTANTIATE_TEST_SUITE_P(Kinds, LockedKind,

@@ -39,7 +39,7 @@ protected:
         return {};
     }
 
-    const session someone = {"https://h", "a@b.example", "token-\"1\""};
+    const session someone = {"https://h", "a@b.example", "token-\\1/+%2f"};
     temporary_folder folder;
     const std::string directory = folder.path_of("state/quillmere");
     const session_file file{directory + "/session.json"};
@@ -121,8 +121,10 @@ TEST_F(SessionFile, IsRefusedWhenItIsALinkOrNoFile)
 TEST_F(SessionFile, IsRefusedWhenDamagedAndSaysSo)
 {
     file.save(someone);
-    for (const char *content : {"", "{", "[]", "{}", "{\"service\": \"https://h\"}", "null",
-                                "{\"service\": 1, \"session_token\": \"t\"}", "\xff\xfe"}) {
+    for (const char *content :
+         {"", "{", "[]", "{}", "{\"service\": \"https://h\"}", "null",
+          "{\"service\": 1, \"session_token\": \"t\"}",
+          "{\"service\": \"https://h\", \"session_token\": \"a&b\"}", "\xff\xfe"}) {
         folder.write("state/quillmere/session.json", content);
         EXPECT_THAT(reason_of_failed_load(), HasSubstr("is damaged")) << content;
     }
@@ -180,6 +182,16 @@ TEST_F(SessionFile, CannotHoldATokenThatIsNoText)
     strange.token = "\xff";
 
     EXPECT_THROW(file.save(strange), failure);
+    EXPECT_FALSE(std::filesystem::exists(file.path()));
+}
+
+TEST_F(SessionFile, CannotHoldATokenThatEndsEarlyInAnAddress)
+{
+    session strange = someone;
+    for (const char letter : {' ', '\n', '\x7f', '&', '#', '"', '\'', '<', '>'}) {
+        strange.token = std::string("to") + letter + "ken";
+        EXPECT_THROW(file.save(strange), failure) << letter;
+    }
     EXPECT_FALSE(std::filesystem::exists(file.path()));
 }
 

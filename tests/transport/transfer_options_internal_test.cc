@@ -293,6 +293,13 @@ INSTANTIATE_TEST_SUITE_P(Options, ForgottenOption,
                          testing::Values(CURLOPT_PROXY, CURLOPT_PROXYUSERNAME,
                                          CURLOPT_PROXYPASSWORD, CURLOPT_CAINFO));
 
+TEST_F(TransferOptions, AreFollowedByZeroWhereNoStatusIsTold)
+{
+    calls.refused_info = CURLINFO_RESPONSE_CODE;
+
+    EXPECT_EQ(fetch(url).code, 0);
+}
+
 class ProbeOptions : public TransferOptions {};
 
 TEST_F(ProbeOptions, OfTheStatusStandInTheirOrder)
@@ -348,6 +355,15 @@ TEST_F(ProbeOptions, NeedAHandle)
     EXPECT_EQ(log.text(), "Could not initialize cUrl.\nResponse does not match: -1\n"
                           "Could not initialize cUrl.\n"
                           "Response does not match because -1 does not match 200!");
+}
+
+TEST_F(ProbeOptions, AreOfNoUseWithoutAStatus)
+{
+    calls.refused_info = CURLINFO_RESPONSE_CODE;
+
+    EXPECT_EQ(check_url_response_code(url, 1000), 0);
+
+    EXPECT_EQ(log.text(), "Response does not match: -1\n");
 }
 
 struct rounding {

@@ -57,7 +57,9 @@ address split(const std::string &url)
 {
     for (const char each : url)
         if (each <= ' ' || each == 0x7f)
-            throw failure(exit_code::other, "the upload address is unusable: " + url);
+            // Behind the question mark is the session token.
+            throw failure(exit_code::other,
+                          "the upload address is unusable: " + url.substr(0, url.find('?')));
     const std::size_t host = url.find("://") + 3;
     const std::size_t path = std::min(url.find('/', host), url.size());
     return {url.substr(host, path - host), url.substr(path)};
