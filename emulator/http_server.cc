@@ -149,16 +149,16 @@ private:
         socket.set_option(tcp::no_delay(true), problem);
         beast::tcp_stream stream(std::move(socket));
         if (tls)
-            start(beast::ssl_stream<beast::tcp_stream>(std::move(stream), *tls));
+            start<asio::ssl::stream<beast::tcp_stream>>(std::move(stream), *tls);
         else
-            start(std::move(stream));
+            start<beast::tcp_stream>(std::move(stream));
     }
 
-    template <class Stream> void start(Stream stream)
+    template <class Stream, class... Parts> void start(Parts &&...parts)
     {
         auto closed = [self = shared_from_this()](open_connection *which) { self->closed(which); };
         const auto made = std::make_shared<connection<Stream>>(
-            std::move(stream), connection_host{limits_, handlers_, std::move(closed)});
+            connection_host{limits_, handlers_, std::move(closed)}, std::forward<Parts>(parts)...);
         open_.insert(made.get());
         made->start();
     }
