@@ -3,6 +3,7 @@
 
 #include <array>
 #include <chrono>
+#include <limits>
 #include <memory>
 #include <optional>
 #include <string_view>
@@ -11,12 +12,12 @@
 #include <boost/asio/buffer.hpp>
 #include <boost/asio/error.hpp>
 #include <boost/asio/ssl/stream.hpp>
+#include <boost/asio/steady_timer.hpp>
 #include <boost/asio/write.hpp>
 #include <boost/beast/core/error.hpp>
 #include <boost/beast/core/stream_traits.hpp>
 #include <boost/beast/core/tcp_stream.hpp>
 
-#include "envelope.h"
 #include "errors.h"
 #include "http_server.h"
 #include "outgoing_reply.h"
@@ -48,7 +49,8 @@ public:
     /** @param parts what the stream is made of */
     template <class... Parts>
     explicit connection(connection_host host, Parts &&...parts)
-        : stream_(std::forward<Parts>(parts)...), host_(std::move(host)), reader_(host_.limits)
+        : stream_(std::forward<Parts>(parts)...), host_(std::move(host)), reader_(host_.limits),
+          pause_(stream_.get_executor())
     {
     }
     ~connection() override { host_.closed(this); }
@@ -70,6 +72,7 @@ public:
     void stop() override
     {
         stopping_ = true;
+        pause_.cancel();
         if (!owes_reply_)
             socket_layer().close();
     }
@@ -194,13 +197,14 @@ private:
         if (request_reader::is_body_too_large(problem))
             return refuse_large("");
         if (request_reader::is_protocol_fault(problem))
-            return refuse_and_close(refuse(refusal(error::malformed_request, problem.message())));
+            return refuse_and_close(
+                host_.handlers.refuse(refusal(error::malformed_request, problem.message())));
         close();
     }
 
     void refuse_large(const std::string &part)
     {
-        refuse_and_close(refuse(refusal(error::request_too_large, part)));
+        refuse_and_close(host_.handlers.refuse(refusal(error::request_too_large, part)));
     }
 
     void refuse_and_close(reply refused) { write(std::move(refused), false); }
@@ -208,15 +212,49 @@ private:
     void write(reply made, bool keep_alive)
     {
         keep_alive_ = keep_alive && !stopping_;
+        const delivery how = made.sending;
         using body = outgoing_reply::body;
         outgoing_.emplace(std::move(made), reader_.http_version(), keep_alive_,
                           asked_.method == "HEAD" ? body::left_out : body::sent);
+        if (how.kind == delivery_kind::withheld)
+            return withhold();
+        if (how.kind == delivery_kind::reset)
+            return tear_down();
+        if (how.delay.count() > 0 && !stopping_)
+            return write_later(how.delay);
         write_piece();
+    }
+
+    // Or at once when the server stops: then every reply under way is finished.
+    void write_later(std::chrono::milliseconds delay)
+    {
+        pause_.expires_after(delay);
+        pause_.async_wait(
+            [self = this->shared_from_this()](beast::error_code) { self->write_piece(); });
+    }
+
+    // The connection stays until the client leaves or the server stops.
+    void withhold()
+    {
+        owes_reply_ = false;
+        socket_layer().expires_never();
+        drain_limit_ = std::numeric_limits<std::uint64_t>::max();
+        drain_more();
+    }
+
+    // Closed in this way the socket tells the client so by a reset.
+    void tear_down()
+    {
+        beast::error_code ignored;
+        socket_layer().socket().set_option(boost::asio::socket_base::linger(true, 0), ignored);
+        socket_layer().close();
     }
 
     // Each piece has its own time: a large file may take long, a client that stalls may not.
     void write_piece()
     {
+        if (outgoing_->is_done())
+            return break_off(); // cut ahead of its first byte
         allow(host_.limits.exchange_time);
         beast::error_code broken;
         const std::string_view piece = outgoing_->next_piece(broken);
@@ -225,13 +263,22 @@ private:
             [self = this->shared_from_this(), broken](beast::error_code problem, std::size_t) {
                 if (!problem && !broken && !self->outgoing_->is_done())
                     return self->write_piece();
-                self->outgoing_.reset();
-                self->sent(problem ? problem : broken);
+                self->outgoing_->is_cut() ? self->break_off()
+                                          : self->sent(problem ? problem : broken);
             });
+    }
+
+    // Over TLS without its farewell, as when a server dies.
+    void break_off()
+    {
+        owes_reply_ = false;
+        allow(host_.limits.exchange_time);
+        drain();
     }
 
     void sent(beast::error_code problem)
     {
+        outgoing_.reset();
         if (problem || !keep_alive_)
             return close();
         read_header();
@@ -253,6 +300,7 @@ private:
     void drain()
     {
         beast::error_code ignored;
+        drain_limit_ = host_.limits.body_bytes;
         socket_layer().socket().shutdown(boost::asio::ip::tcp::socket::shutdown_send, ignored);
         drain_more();
     }
@@ -263,7 +311,7 @@ private:
             boost::asio::buffer(discarded_),
             [self = this->shared_from_this()](beast::error_code problem, std::size_t got) {
                 self->drained_ += got;
-                if (!problem && self->drained_ < self->host_.limits.body_bytes)
+                if (!problem && self->drained_ < self->drain_limit_)
                     self->drain_more();
             });
     }
@@ -275,8 +323,10 @@ private:
     request asked_{};
     std::unique_ptr<body_receiver> receiver_; // of an upload that is under way
     std::optional<outgoing_reply> outgoing_;
+    boost::asio::steady_timer pause_; // ahead of a reply
     std::array<char, 4096> discarded_{};
     std::uint64_t drained_ = 0;
+    std::uint64_t drain_limit_ = 0;
     bool owes_reply_ = false;
     bool keep_alive_ = false;
     bool stopping_ = false;

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <limits>
 #include <sstream>
 
 #include <unistd.h>
@@ -39,8 +40,10 @@ std::string head_of(const reply &made, unsigned http_version, bool keep_alive)
 } // namespace
 
 outgoing_reply::outgoing_reply(reply made, unsigned http_version, bool keep_alive, body what)
-    : piece_(head_of(made, http_version, keep_alive))
+    : piece_(head_of(made, http_version, keep_alive)),
+      is_cut_(made.sending.kind == delivery_kind::cut)
 {
+    left_ = is_cut_ ? made.sending.cut_after : std::numeric_limits<std::uint64_t>::max();
     if (what == body::left_out)
         return;
     if (made.file)
@@ -57,7 +60,9 @@ std::string_view outgoing_reply::next_piece(boost::system::error_code &problem)
     is_begun_ = true;
     if (file_.length > 0)
         append_file(problem);
-    return piece_;
+    const std::string_view piece = std::string_view(piece_).substr(0, left_);
+    left_ -= piece.size();
+    return piece;
 }
 
 void outgoing_reply::append_file(boost::system::error_code &problem)

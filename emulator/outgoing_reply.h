@@ -18,7 +18,8 @@ public:
 
     outgoing_reply(reply made, unsigned http_version, bool keep_alive, body what);
 
-    bool is_done() const { return is_begun_ && file_.length == 0; }
+    bool is_done() const { return left_ == 0 || (is_begun_ && file_.length == 0); }
+    bool is_cut() const { return is_cut_; }
 
     /**
      * The next piece, up to 64 KiB of a file; it holds until the next call. The problem is set when
@@ -30,7 +31,9 @@ private:
     void append_file(boost::system::error_code &problem);
 
     std::string piece_;
-    file_part file_; // what is left of it
+    file_part file_;     // what is left of it
+    std::uint64_t left_; // before it is cut
+    bool is_cut_;
     bool is_begun_ = false;
 };
 
