@@ -54,7 +54,6 @@ constexpr extension_text server_extensions[] = {
     {NID_basic_constraints, "critical,CA:FALSE"},
     {NID_key_usage, "critical,digitalSignature"},
     {NID_ext_key_usage, "serverAuth"},
-    {NID_subject_alt_name, "DNS:localhost,IP:127.0.0.1,IP:::1"},
     {NID_subject_key_identifier, "hash"},
     {NID_authority_key_identifier, "keyid:always"},
 };
@@ -83,26 +82,30 @@ void set_name(X509_NAME *name, const std::string &common_name)
     require(X509_NAME_add_entry_by_txt(name, "CN", MBSTRING_UTF8, text, -1, -1, 0) == 1, "name");
 }
 
-void set_validity(X509 *cert, std::int64_t now, std::int64_t lifetime)
+void set_validity(X509 *cert, std::int64_t begin, std::int64_t end)
 {
-    require(ASN1_TIME_set(X509_getm_notBefore(cert), now - clock_tolerance) &&
-                ASN1_TIME_set(X509_getm_notAfter(cert), now + lifetime),
+    require(ASN1_TIME_set(X509_getm_notBefore(cert), begin) &&
+                ASN1_TIME_set(X509_getm_notAfter(cert), end),
             "validity");
+}
+
+void add_extension(X509 *cert, X509 *issuer, const extension_text &text)
+{
+    X509V3_CTX context;
+    X509V3_set_ctx_nodb(&context);
+    X509V3_set_ctx(&context, issuer, cert, nullptr, nullptr, 0);
+    const extension made(X509V3_EXT_conf_nid(nullptr, &context, text.kind, text.value));
+    require(made && X509_add_ext(cert, made.get(), -1) == 1, "extension");
 }
 
 template <std::size_t Count>
 void add_extensions(X509 *cert, X509 *issuer, const extension_text (&texts)[Count])
 {
-    X509V3_CTX context;
-    X509V3_set_ctx_nodb(&context);
-    X509V3_set_ctx(&context, issuer, cert, nullptr, nullptr, 0);
-    for (const extension_text &text : texts) {
-        const extension made(X509V3_EXT_conf_nid(nullptr, &context, text.kind, text.value));
-        require(made && X509_add_ext(cert, made.get(), -1) == 1, "extension");
-    }
+    for (const extension_text &text : texts)
+        add_extension(cert, issuer, text);
 }
 
-identity begin_identity(const std::string &common_name, std::int64_t now, std::int64_t lifetime)
+identity begin_identity(const std::string &common_name, std::int64_t begin, std::int64_t end)
 {
     identity made{private_key(EVP_EC_gen("P-256")), certificate(X509_new())};
     require(made.key && made.cert, "key");
@@ -110,7 +113,7 @@ identity begin_identity(const std::string &common_name, std::int64_t now, std::i
     require(X509_set_version(cert, X509_VERSION_3) == 1, "version");
     set_serial(cert);
     set_name(X509_get_subject_name(cert), common_name);
-    set_validity(cert, now, lifetime);
+    set_validity(cert, begin, end);
     require(X509_set_pubkey(cert, made.key.get()) == 1, "key");
     return made;
 }
@@ -124,17 +127,37 @@ void sign(X509 *cert, const X509 *issuer, EVP_PKEY *issuer_key)
 identity make_root(std::int64_t now)
 {
     // A number in the name keeps the roots of several data folders apart in one bundle.
-    identity root = begin_identity("quillmere-emulator root " + random_hex(4), now, root_lifetime);
+    identity root = begin_identity("quillmere-emulator root " + random_hex(4),
+                                   now - clock_tolerance, now + root_lifetime);
     add_extensions(root.cert.get(), root.cert.get(), root_extensions);
     sign(root.cert.get(), root.cert.get(), root.key.get());
     return root;
 }
 
-identity make_server(const identity &root, std::int64_t now)
+/** Whom a certificate is for, and when it holds, in seconds after now. */
+struct server_terms {
+    const char *common_name;
+    const char *names;
+    std::int64_t begin;
+    std::int64_t end;
+};
+
+constexpr const char *own_names = "DNS:localhost,IP:127.0.0.1,IP:::1";
+constexpr server_terms sound_terms = {"localhost", own_names, -clock_tolerance, server_lifetime};
+constexpr server_terms expired_terms = {"localhost", own_names, -server_lifetime, -clock_tolerance};
+// Below localhost, since the root can vouch for no other name: it is to be refused for its host.
+constexpr server_terms wrong_host_terms = {"other.localhost", "DNS:other.localhost",
+                                           -clock_tolerance, server_lifetime};
+
+// Without a root it vouches for itself.
+identity make_server(const identity *root, const server_terms &terms, std::int64_t now)
 {
-    identity server = begin_identity("localhost", now, server_lifetime);
-    add_extensions(server.cert.get(), root.cert.get(), server_extensions);
-    sign(server.cert.get(), root.cert.get(), root.key.get());
+    identity server = begin_identity(terms.common_name, now + terms.begin, now + terms.end);
+    const identity &issuer = root ? *root : server;
+    X509 *cert = server.cert.get();
+    add_extension(cert, issuer.cert.get(), {NID_subject_alt_name, terms.names});
+    add_extensions(cert, issuer.cert.get(), server_extensions);
+    sign(cert, issuer.cert.get(), issuer.key.get());
     return server;
 }
 
@@ -147,16 +170,24 @@ template <class Write> std::string pem(Write write)
     return std::string(text, static_cast<std::size_t>(length));
 }
 
+certificate_text text_of(const identity &made)
+{
+    return {
+        pem([&made](BIO *to) { return PEM_write_bio_X509(to, made.cert.get()); }),
+        pem([&made](BIO *to) {
+            return PEM_write_bio_PrivateKey(to, made.key.get(), nullptr, nullptr, 0, nullptr,
+                                            nullptr);
+        }),
+    };
+}
+
 // The key first: a certificate whose key is another one is found out, and made anew.
 void write_identity(const identity &made, const std::filesystem::path &cert_file,
                     const std::filesystem::path &key_file)
 {
-    const auto write_key = [&made](BIO *to) {
-        return PEM_write_bio_PrivateKey(to, made.key.get(), nullptr, nullptr, 0, nullptr, nullptr);
-    };
-    const auto write_cert = [&made](BIO *to) { return PEM_write_bio_X509(to, made.cert.get()); };
-    write_file(key_file, pem(write_key), 0600);
-    write_file(cert_file, pem(write_cert), 0644);
+    const certificate_text text = text_of(made);
+    write_file(key_file, text.key, 0600);
+    write_file(cert_file, text.certificate, 0644);
 }
 
 memory_file open_pem(const std::filesystem::path &path, std::string &text)
@@ -206,7 +237,18 @@ void ensure_certificates(const data_directory &in, std::int64_t now)
     }
     const identity server = read_identity(in.server_certificate(), in.server_key());
     if (!is_sound(server, root.key.get(), now))
-        write_identity(make_server(root, now), in.server_certificate(), in.server_key());
+        write_identity(make_server(&root, sound_terms, now), in.server_certificate(),
+                       in.server_key());
+}
+
+certificate_text make_variant(const data_directory &in, certificate_variant which, std::int64_t now)
+{
+    if (which == certificate_variant::self_signed)
+        return text_of(make_server(nullptr, sound_terms, now));
+    const identity root = read_identity(in.root_certificate(), in.root_key());
+    require(root.key && root.cert, "root");
+    const bool is_expired = which == certificate_variant::expired;
+    return text_of(make_server(&root, is_expired ? expired_terms : wrong_host_terms, now));
 }
 
 } // namespace emulator

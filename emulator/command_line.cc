@@ -7,6 +7,7 @@
 
 #include "commands.h"
 #include "data_directory.h"
+#include "loopback_address.h"
 #include "serve.h"
 
 namespace emulator {
@@ -59,6 +60,16 @@ void define_serving(CLI::App &app, arguments &into)
                    "Open descriptor to write the same to")
         ->check(CLI::Range(0, std::numeric_limits<int>::max()))
         ->type_name("N");
+    app.add_option_function<std::string>(
+           "--admin",
+           [&into](const std::string &text) {
+               into.serving.admin = parse_loopback_address(text);
+               if (!into.serving.admin)
+                   throw CLI::ValidationError(
+                       "--admin", text + " is no loopback address such as 127.0.0.1:0 or [::1]:0");
+           },
+           "Address for faults, counts and resets; port 0 lets the kernel pick")
+        ->type_name("ADDRESS:PORT");
     app.add_option("--session-lifetime", into.serving.session_lifetime,
                    "Seconds until an unused session expires (600)")
         ->check(CLI::Range(std::int64_t{1}, longest_session))

@@ -38,6 +38,12 @@ bool is_machine_without_ipv6(const boost::system::error_code &problem)
            problem == boost::system::errc::address_not_available;
 }
 
+std::runtime_error cannot_listen(std::uint16_t port, const boost::system::system_error &why)
+{
+    return std::runtime_error("cannot listen on port " + std::to_string(port) + ": " +
+                              why.code().message());
+}
+
 // Clients that resolve "localhost" may try either address, so both must be ours or neither.
 std::vector<tcp::acceptor> open_pair(asio::io_context &context, std::uint16_t port)
 {
@@ -62,8 +68,7 @@ std::vector<tcp::acceptor> open_acceptors(asio::io_context &context, std::uint16
         } catch (const boost::system::system_error &problem) {
             const bool unlucky = port == 0 && problem.code() == asio::error::address_in_use;
             if (!unlucky || attempt == port_attempts)
-                throw std::runtime_error("cannot listen on port " + std::to_string(port) + ": " +
-                                         problem.code().message());
+                throw cannot_listen(port, problem);
         }
     }
 }
@@ -77,15 +82,29 @@ public:
     {
     }
 
-    std::uint16_t listen(std::uint16_t port, asio::ssl::context *tls)
+    std::uint16_t listen(std::uint16_t port, const certificate_choice &tls)
     {
         std::uint16_t bound = port;
-        for (tcp::acceptor &acceptor : open_acceptors(context_, port)) {
-            bound = acceptor.local_endpoint().port();
-            listeners_.push_back({std::move(acceptor), asio::steady_timer(context_), tls});
-            accept(listeners_.back());
-        }
+        for (tcp::acceptor &acceptor : open_acceptors(context_, port))
+            bound = listen(std::move(acceptor), tls);
         return bound;
+    }
+
+    std::uint16_t listen(tcp::acceptor acceptor, const certificate_choice &tls)
+    {
+        const std::uint16_t bound = acceptor.local_endpoint().port();
+        listeners_.push_back({std::move(acceptor), asio::steady_timer(context_), tls});
+        accept(listeners_.back());
+        return bound;
+    }
+
+    std::uint16_t listen(const tcp::endpoint &at)
+    {
+        try {
+            return listen(open_acceptor(context_, at), nullptr);
+        } catch (const boost::system::system_error &problem) {
+            throw cannot_listen(at.port(), problem);
+        }
     }
 
     void stop(std::function<void()> finished)
@@ -110,8 +129,8 @@ private:
     struct listener {
         tcp::acceptor acceptor;
         asio::steady_timer pause;
-        asio::ssl::context *tls;
-        bool waiting = false; // for a connection to end
+        certificate_choice tls; // null for HTTP
+        bool waiting = false;   // for a connection to end
     };
 
     void accept(listener &on)
@@ -140,7 +159,7 @@ private:
         });
     }
 
-    void serve(tcp::socket socket, asio::ssl::context *tls)
+    void serve(tcp::socket socket, const certificate_choice &tls)
     {
         beast::error_code problem;
         const tcp::endpoint client = socket.remote_endpoint(problem);
@@ -149,16 +168,16 @@ private:
         socket.set_option(tcp::no_delay(true), problem);
         beast::tcp_stream stream(std::move(socket));
         if (tls)
-            start(beast::ssl_stream<beast::tcp_stream>(std::move(stream), *tls));
+            start<asio::ssl::stream<beast::tcp_stream>>(std::move(stream), tls());
         else
-            start(std::move(stream));
+            start<beast::tcp_stream>(std::move(stream));
     }
 
-    template <class Stream> void start(Stream stream)
+    template <class Stream, class... Parts> void start(Parts &&...parts)
     {
         auto closed = [self = shared_from_this()](open_connection *which) { self->closed(which); };
         const auto made = std::make_shared<connection<Stream>>(
-            std::move(stream), connection_host{limits_, handlers_, std::move(closed)});
+            connection_host{limits_, handlers_, std::move(closed)}, std::forward<Parts>(parts)...);
         open_.insert(made.get());
         made->start();
     }
@@ -196,10 +215,12 @@ http_server::http_server(asio::io_context &context, const server_limits &limits,
 
 http_server::~http_server() { state_->forget(); }
 
-std::uint16_t http_server::listen(std::uint16_t port, asio::ssl::context *tls)
+std::uint16_t http_server::listen(std::uint16_t port, const certificate_choice &tls)
 {
     return state_->listen(port, tls);
 }
+
+std::uint16_t http_server::listen(const tcp::endpoint &at) { return state_->listen(at); }
 
 void http_server::stop(std::function<void()> finished) { state_->stop(std::move(finished)); }
 

@@ -1,32 +1,33 @@
 // HTTP and HTTPS on the loopback interface, with every limit in its own hands.
 #pragma once
 
-#include <chrono>
-#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <memory>
 
 #include <boost/asio/io_context.hpp>
+#include <boost/asio/ip/tcp.hpp>
 #include <boost/asio/ssl/context.hpp>
 
+#include "envelope.h"
+#include "errors.h"
+#include "server_limits.h"
 #include "service.h"
 
 namespace emulator {
-
-struct server_limits {
-    std::uint32_t header_bytes = 64 * 1024; // the target with its query included
-    std::uint64_t body_bytes = 1024 * 1024;
-    std::size_t connections = 256;          // further ones wait in the kernel's queue
-    std::chrono::seconds exchange_time{30}; // for a handshake, a request, a reply
-    std::chrono::seconds idle_time{60};     // between two requests of one connection
-};
 
 struct request_handlers {
     std::function<reply(const request &)> answer;
     /** Asked first, with the header alone; null when the body is to be read into the request. */
     std::function<std::unique_ptr<body_receiver>(const request &)> receive;
+    /** What is told to who breaks the protocol or a limit. */
+    std::function<reply(const refusal &)> refuse = [](const refusal &why) {
+        return emulator::refuse(why);
+    };
 };
+
+/** The certificate of the next connection; it must outlive the server. */
+using certificate_choice = std::function<boost::asio::ssl::context &()>;
 
 /** Serves on one thread, the one that runs the context: no handler is run twice at once. */
 class http_server {
@@ -39,10 +40,13 @@ public:
      * Listens on 127.0.0.1 and, where the machine has it, on ::1, on one and the same port.
      *
      * @param port 0 lets the kernel pick one
-     * @param tls  the certificate to serve HTTPS with, or null for HTTP; must outlive the server
+     * @param tls  the certificates to serve HTTPS with, or null for HTTP
      * @return the port
      */
-    std::uint16_t listen(std::uint16_t port, boost::asio::ssl::context *tls);
+    std::uint16_t listen(std::uint16_t port, const certificate_choice &tls);
+
+    /** Listens with HTTP on one address alone, which must be a loopback one. Returns the port. */
+    std::uint16_t listen(const boost::asio::ip::tcp::endpoint &at);
 
     /**
      * Accepts nothing more, ends idle connections, and lets each reply under way be finished.

@@ -29,6 +29,14 @@ std::string json_text(const std::string &text)
     return quoted + '"';
 }
 
+std::string admin_members(const listening_at &where)
+{
+    if (!where.admin)
+        return "";
+    return ", \"admin_port\": " + std::to_string(where.admin->port) +
+           ", \"admin_url\": " + json_text(where.admin->http_url());
+}
+
 } // namespace
 
 std::string listening_at::https_url() const { return url("https", https_port); }
@@ -42,7 +50,7 @@ std::string ready_line(const listening_at &where)
            ", \"https_url\": " + json_text(where.https_url()) +
            ", \"http_url\": " + json_text(where.http_url()) +
            ", \"ca_file\": " + json_text(where.root_certificate.string()) +
-           ", \"pid\": " + std::to_string(::getpid()) + "}\n";
+           ", \"pid\": " + std::to_string(::getpid()) + admin_members(where) + "}\n";
 }
 
 ready_signal::ready_signal(std::filesystem::path file, int descriptor)

@@ -3,7 +3,10 @@
 
 #include <cstdint>
 #include <filesystem>
+#include <optional>
 #include <string>
+
+#include "loopback_address.h"
 
 namespace emulator {
 
@@ -11,6 +14,7 @@ struct listening_at {
     std::uint16_t https_port;
     std::uint16_t http_port;
     std::filesystem::path root_certificate;
+    std::optional<loopback_address> admin = {};
 
     std::string https_url() const;
     std::string http_url() const;

@@ -4,6 +4,7 @@
 #include <cstdint>
 
 #include <boost/asio/buffer.hpp>
+#include <boost/asio/error.hpp>
 #include <boost/beast/core/buffers_range.hpp>
 #include <boost/beast/core/error.hpp>
 #include <boost/beast/http/message.hpp>

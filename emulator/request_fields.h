@@ -40,7 +40,8 @@ template <class Message> request request_of(const Message &message, std::string 
             text(field::if_range),
             text(field::content_disposition),
             text("Content-Digest"),
-            text("Repr-Digest")};
+            text("Repr-Digest"),
+            text(field::origin)};
 }
 
 } // namespace emulator

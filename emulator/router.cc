@@ -114,6 +114,8 @@ const std::vector<endpoint> &endpoint_table()
     return table;
 }
 
+bool is_endpoint(std::string_view path) { return find_endpoint(path) != nullptr; }
+
 reply answer(const request &asked, service &state)
 {
     const split_target parts = split(asked.target);

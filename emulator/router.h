@@ -1,6 +1,7 @@
 // From a request to a reply: finds the endpoint, checks the session, wraps the answer.
 #pragma once
 
+#include <string_view>
 #include <vector>
 
 #include "caller.h"
@@ -22,6 +23,7 @@ struct endpoint {
 };
 
 const std::vector<endpoint> &endpoint_table();
+bool is_endpoint(std::string_view path);
 
 /** Serves a request. Whatever happens, the reply is an envelope. */
 reply answer(const request &asked, service &state);

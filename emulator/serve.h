@@ -3,6 +3,9 @@
 
 #include <cstdint>
 #include <filesystem>
+#include <optional>
+
+#include "loopback_address.h"
 
 namespace emulator {
 
@@ -13,6 +16,7 @@ struct serve_settings {
     std::filesystem::path ready_file; // empty for none
     int ready_descriptor = -1;        // negative for none
     std::int64_t session_lifetime = 600;
+    std::optional<loopback_address> admin; // nothing for no admin address
 };
 
 /** Returns after SIGINT or SIGTERM. Throws what keeps it from starting. */

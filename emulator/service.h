@@ -1,6 +1,7 @@
 // What every request is served with.
 #pragma once
 
+#include <chrono>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -37,6 +38,7 @@ struct request {
     std::string content_disposition = {};
     std::string content_digest = {};
     std::string repr_digest = {};
+    std::string web_page = {}; // "Origin", which browsers add: whose page asks
     std::optional<std::uint64_t> content_length = {}; // unknown of a body in chunks
 };
 
@@ -52,12 +54,27 @@ struct header_field {
     std::string value;
 };
 
+/** What becomes of a reply. All but the first is for tests of clients. */
+enum class delivery_kind {
+    whole,
+    cut,      // the connection ends behind some bytes of it
+    withheld, // it never comes, and the connection stays
+    reset,    // the connection is torn down instead
+};
+
+struct delivery {
+    delivery_kind kind = delivery_kind::whole;
+    std::uint64_t cut_after = 0; // bytes, those of the header included
+    std::chrono::milliseconds delay{0};
+};
+
 /** What is sent back. */
 struct reply {
     unsigned http_status;
     std::string body;
     std::optional<file_part> file = {};    // in place of the body
     std::vector<header_field> fields = {}; // beside the usual ones, or in place of them
+    delivery sending = {};
 };
 
 /** Takes the body of one request while it arrives. Nothing is thrown: what goes wrong is answered.

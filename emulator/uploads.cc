@@ -17,7 +17,6 @@
 namespace emulator {
 namespace {
 
-constexpr std::string_view upload_path = "/api/upload/upload.php";
 constexpr std::string_view upload_action = "upload/upload";
 
 /** What a request says of its bytes ahead of them. */

@@ -2,10 +2,13 @@
 #pragma once
 
 #include <memory>
+#include <string_view>
 
 #include "service.h"
 
 namespace emulator {
+
+inline constexpr std::string_view upload_path = "/api/upload/upload.php";
 
 /** Begins with an upload; null for a request that is none. */
 std::unique_ptr<body_receiver> receive_upload(const request &asked, service &state);

@@ -18,6 +18,7 @@ using namespace emulator;
 
 namespace {
 
+const std::string odd_request = "GET /odd HTTP/1.1\r\nHost: localhost\r\n\r\n";
 const std::string status_request = "GET /echo HTTP/1.1\r\nHost: localhost\r\n\r\n";
 
 /** A server with small limits that answers with what it was asked. */
@@ -27,8 +28,12 @@ protected:
     {
         const auto echo = [this](const request &asked) {
             ++answered;
-            return reply{200, asked.method + " " + asked.target + " " + asked.content_type + " [" +
-                                  asked.body + "]"};
+            return reply{200,
+                         asked.method + " " + asked.target + " " + asked.content_type + " [" +
+                             asked.body + "]",
+                         {},
+                         {},
+                         asked.target == "/odd" ? sending : delivery{}};
         };
         server.emplace(context, with,
                        request_handlers{echo, [](const request &) { return nullptr; }});
@@ -40,6 +45,12 @@ protected:
     {
         boost::asio::post(context, [this] { server->stop(nullptr); });
         thread.join();
+    }
+
+    void wait_until_answered(int count) const
+    {
+        while (answered < count)
+            std::this_thread::yield();
     }
 
     static server_limits small()
@@ -61,6 +72,7 @@ protected:
     std::optional<http_server> server;
     std::uint16_t port = 0;
     std::atomic<int> answered{0};
+    delivery sending; // of the reply to what is asked of /odd
     std::thread thread;
 };
 
@@ -290,4 +302,141 @@ TEST_F(HttpServer, SaysThatAPortIsTaken)
     http_server other(other_context, {}, {});
 
     EXPECT_THROW(other.listen(port, nullptr), std::runtime_error);
+}
+
+TEST_F(HttpServer, CutsAReplyBehindTheBytesItIsToldAndEndsTheConnection)
+{
+    sending = {delivery_kind::cut, 12};
+    start(small());
+    socket_client client(port);
+
+    client.send(odd_request + status_request);
+
+    EXPECT_EQ(client.read_to_end(), "HTTP/1.1 200");
+    EXPECT_FALSE(client.was_reset());
+    EXPECT_EQ(answered, 1);
+}
+
+TEST_F(HttpServer, EndsTheConnectionBehindAReplyThatIsShorterThanItsCut)
+{
+    sending = {delivery_kind::cut, 100000};
+    start(small());
+    socket_client client(port);
+
+    client.send(odd_request);
+
+    EXPECT_TRUE(ends_with(client.read_to_end(), "GET /odd  []"));
+}
+
+TEST_F(HttpServer, EndsTheConnectionWithoutAnyByteOfALostReply)
+{
+    sending = {delivery_kind::cut, 0};
+    start(small());
+    socket_client client(port);
+
+    client.send(odd_request);
+
+    EXPECT_EQ(client.read_to_end(), "");
+    EXPECT_FALSE(client.was_reset());
+    EXPECT_EQ(answered, 1);
+}
+
+TEST_F(HttpServer, TearsAConnectionDown)
+{
+    sending = {delivery_kind::reset};
+    start(small());
+    socket_client client(port);
+
+    client.send(odd_request);
+
+    EXPECT_EQ(client.read_to_end(), "");
+    EXPECT_TRUE(client.was_reset());
+}
+
+TEST_F(HttpServer, AnswersLaterWithoutHoldingUpOthers)
+{
+    constexpr std::chrono::milliseconds delay{300};
+    sending = {delivery_kind::whole, 0, delay};
+    start(small());
+    socket_client waiting(port);
+    socket_client other(port);
+
+    const auto begin = std::chrono::steady_clock::now();
+    waiting.send(odd_request);
+    waiting.send(status_request);
+    other.send(status_request);
+    EXPECT_TRUE(ends_with(other.read_reply(), "GET /echo  []"));
+    EXPECT_TRUE(ends_with(waiting.read_reply(), "GET /odd  []"));
+
+    EXPECT_GE(std::chrono::steady_clock::now() - begin, delay);
+    EXPECT_TRUE(ends_with(waiting.read_reply(), "GET /echo  []"));
+}
+
+TEST_F(HttpServer, FinishesADelayedReplyAtOnceWhenItStops)
+{
+    sending = {delivery_kind::whole, 0, std::chrono::hours(1)};
+    start(small());
+    socket_client client(port);
+    client.send(odd_request);
+    wait_until_answered(1);
+
+    boost::asio::post(context, [this] { server->stop(nullptr); });
+
+    EXPECT_TRUE(ends_with(client.read_to_end(), "GET /odd  []"));
+}
+
+TEST_F(HttpServer, WithholdsAReplyUntilItStops)
+{
+    sending = {delivery_kind::withheld};
+    start(small());
+    socket_client client(port);
+    client.send(odd_request);
+    wait_until_answered(1);
+    socket_client other(port);
+    other.send(status_request);
+    other.read_reply(); // the one thread has been through with the first by now
+    EXPECT_TRUE(client.is_silent());
+
+    boost::asio::post(context, [this] { server->stop(nullptr); });
+
+    EXPECT_EQ(client.read_to_end(), "");
+}
+
+TEST_F(HttpServer, ForgetsAWithheldReplyWhenItsClientLeaves)
+{
+    server_limits limits = small();
+    limits.connections = 1;
+    sending = {delivery_kind::withheld};
+    start(limits);
+    std::optional<socket_client> client(port);
+    client->send(odd_request);
+    wait_until_answered(1);
+
+    client.reset();
+
+    EXPECT_NE(get(port, "/echo"), ""); // there is room for it again
+}
+
+TEST_F(HttpServer, ListensOnOneAddressAlone)
+{
+    start(small());
+    boost::asio::io_context other_context;
+    http_server other(other_context, {}, {});
+
+    // On the first one the port is taken.
+    EXPECT_EQ(other.listen({boost::asio::ip::make_address("127.0.0.2"), port}), port);
+    EXPECT_THROW(other.listen({boost::asio::ip::make_address("127.0.0.1"), port}),
+                 std::runtime_error);
+}
+
+TEST_F(HttpServer, ExplainsARefusalBehindAReplyThatHadNoBody)
+{
+    start(small());
+    socket_client client(port);
+
+    client.send("HEAD /echo HTTP/1.1\r\nHost: localhost\r\n\r\n");
+    client.read_until("\r\n\r\n");
+    client.send("nonsense\r\n\r\n");
+
+    EXPECT_EQ(element(client.read_to_end(), "error"), "103");
 }

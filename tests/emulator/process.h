@@ -25,6 +25,8 @@ public:
     const std::string &ready_line() const { return ready_line_; }
     std::uint16_t https_port() const { return port_after("\"https_port\": "); }
     std::uint16_t http_port() const { return port_after("\"http_port\": "); }
+    /** Of a server that was started with "--admin". */
+    std::uint16_t admin_port() const { return port_after("\"admin_port\": "); }
     std::filesystem::path root() const;
     pid_t id() const { return id_; }
 

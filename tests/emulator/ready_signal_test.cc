@@ -28,6 +28,17 @@ std::string expected_line()
 
 TEST(ReadySignal, IsOneLineOfJson) { EXPECT_EQ(ready_line(where), expected_line()); }
 
+TEST(ReadySignal, TellsTheAdminAddressBehindTheRest)
+{
+    listening_at with_admin = where;
+    with_admin.admin = loopback_address{"::1", 4711};
+
+    std::string expected = expected_line();
+    expected.insert(expected.rfind('}'),
+                    ", \"admin_port\": 4711, \"admin_url\": \"http://[::1]:4711\"");
+    EXPECT_EQ(ready_line(with_admin), expected);
+}
+
 TEST(ReadySignal, RemovesWhatAnEarlierRunLeftAndWhatItWroteItself)
 {
     const scratch_directory scratch;

@@ -1,8 +1,10 @@
 #include "socket_client.h"
 
+#include <cerrno>
 #include <stdexcept>
 
 #include <netinet/in.h>
+#include <poll.h>
 #include <sys/socket.h>
 
 #include <openssl/ssl.h>
@@ -86,9 +88,16 @@ bool socket_client::read_piece()
 {
     char piece[4096];
     const ssize_t got = ::recv(socket_.number(), piece, sizeof piece, 0);
+    was_reset_ = got < 0 && errno == ECONNRESET;
     if (got > 0)
         received_.append(piece, static_cast<std::size_t>(got));
     return got > 0;
+}
+
+bool socket_client::is_silent() const
+{
+    pollfd waiting{socket_.number(), POLLIN, 0};
+    return received_.empty() && ::poll(&waiting, 1, 0) == 0;
 }
 
 std::string socket_client::read_until(const std::string &text)
@@ -127,6 +136,15 @@ std::string get(std::uint16_t port, const std::string &target)
     return client.read_to_end();
 }
 
+std::string ask(std::uint16_t port, const std::string &method, const std::string &target,
+                const std::string &body)
+{
+    socket_client client(port);
+    client.send(method + " " + target + " HTTP/1.1\r\nHost: localhost\r\nConnection: close\r\n" +
+                "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body);
+    return client.read_to_end();
+}
+
 std::string get_verified(std::uint16_t port, const std::string &target,
                          const std::filesystem::path &root, const std::string &name)
 {
@@ -142,7 +160,8 @@ std::string ask_verified(std::uint16_t port, const std::string &request,
     expect_name(session.get(), name);
     SSL_set_fd(session.get(), socket.number());
     if (SSL_connect(session.get()) != 1)
-        throw std::runtime_error("TLS handshake");
+        throw std::runtime_error(
+            X509_verify_cert_error_string(SSL_get_verify_result(session.get())));
     SSL_write(session.get(), request.data(), static_cast<int>(request.size()));
     std::string reply;
     char piece[4096];

@@ -23,20 +23,29 @@ public:
     std::string read_reply();
     /** Reads until the server closes. */
     std::string read_to_end();
+    /** Whether nothing has come, not even an end, that was not read. */
+    bool is_silent() const;
+    /** Whether the connection was over because the server tore it down. */
+    bool was_reset() const { return was_reset_; }
 
 private:
     bool read_piece();
 
     emulator::descriptor socket_;
     std::string received_;
+    bool was_reset_ = false;
 };
 
 /** One GET over HTTP on a connection of its own; the whole reply. */
 std::string get(std::uint16_t port, const std::string &target);
 
+/** The same of any method and body. */
+std::string ask(std::uint16_t port, const std::string &method, const std::string &target,
+                const std::string &body = {});
+
 /**
- * One GET over HTTPS with the peer verified against the root and the name. Throws when the
- * certificate does not hold.
+ * One GET over HTTPS with the peer verified against the root and the name. Throws what the
+ * certificate lacks when it does not hold.
  */
 std::string get_verified(std::uint16_t port, const std::string &target,
                          const std::filesystem::path &root, const std::string &name);

@@ -38,11 +38,12 @@ void emulator_account::start()
 {
     command what;
     what.program = QUILLMERE_EMULATOR;
-    what.arguments = {"--data",     data, "--port",       "0",       "--http-port", "0",
-                      "--ready-fd", "3",  "--ready-file", ready_file};
+    what.arguments = {"--data",     data, "--port",  "0",           "--http-port",  "0",
+                      "--ready-fd", "3",  "--admin", "127.0.0.1:0", "--ready-file", ready_file};
     emulator = std::make_unique<process>(what);
     const std::string line = emulator->wait_for_line(channel::report, "https_url");
     base = json::parse(line).at("https_url");
+    admin_url = json::parse(line).at("admin_url");
     home.environment["QUILLMERE_EMULATOR"] = ready_file;
 }
 

@@ -48,6 +48,7 @@ protected:
     const std::string ready_file = home.folder().path_of("ready.json");
     std::unique_ptr<process> emulator;
     std::string base;
+    std::string admin_url; // see emulator_admin
 
 private:
     void start();
