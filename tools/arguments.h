@@ -19,6 +19,7 @@ struct common_arguments {
     std::optional<int> retries;
     bool insecure = false;
     bool plain_http = false;
+    std::string color = "auto"; ///< one of color_words
     bool json = false;
     bool verbose = false;
 };

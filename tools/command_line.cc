@@ -6,6 +6,7 @@
 #include <CLI/CLI.hpp>
 #include <quillmere.h>
 
+#include "color.h"
 #include "command.h"
 #include "console.h"
 #include "failure.h"
@@ -55,6 +56,10 @@ void declare_conduct_options(CLI::App &app, common_arguments &given)
     app.add_option("--log-file", given.log_file, "Append the exchanges to a file")
         ->option_text("FILE");
 }
+    app.add_option("--color", given.color, "Whether text is coloured: auto, always or never")
+        ->option_text("WHEN")
+        ->check(CLI::IsMember(
+            std::vector<std::string>(std::begin(color_words), std::end(color_words))));
 
 void declare_commands(CLI::App &app, arguments &given, const command *&chosen)
 {
@@ -198,11 +203,20 @@ int report(const failure &problem, results &output)
         if (output.format() == result_format::json)
             output.write(json_of(problem));
         else
-            write_all(STDERR_FILENO, line_of(problem));
+            complain(problem);
     } catch (const failure &unwritable) {
-        write_all(STDERR_FILENO, line_of(unwritable));
+        complain(unwritable);
     }
     return static_cast<int>(problem.code);
+void choose_colors(int count, char **words, const environment &surroundings, results &output)
+{
+    const color_choice choice = color_choice_in(count, words);
+    // Whoever reads JSON reads what is beside it with a program, too.
+    const bool readable = output.format() == result_format::text;
+    output.set_colors(readable && wants_color(choice, surroundings, output.is_terminal()));
+    color_messages(readable && wants_color(choice, surroundings, ::isatty(STDERR_FILENO) == 1));
+}
+
 }
 
 } // namespace
@@ -221,3 +235,4 @@ int run_command_line(int count, char **words, const environment &surroundings, r
 }
 
 } // namespace quillmere::tools
+        choose_colors(count, words, surroundings, output);
