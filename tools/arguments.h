@@ -14,6 +14,8 @@ struct common_arguments {
     std::optional<std::string> emulator;
     std::optional<std::string> profile;
     std::optional<std::string> ca_file;
+    std::optional<std::string> proxy;
+    std::optional<std::string> session_file;
     std::optional<std::string> log_file;
     std::optional<int> timeout;
     std::optional<int> retries;

@@ -41,6 +41,10 @@ void declare_service_options(CLI::App &app, common_arguments &given)
         ->excludes(ca_file);
     app.add_flag("--plain-http", given.plain_http,
                  "Leave requests unencrypted that the service takes so");
+    app.add_option("--proxy", given.proxy, "Proxy on the way to the service (http://host:port)")
+        ->option_text("URL");
+    app.add_option("--session-file", given.session_file, "Where the session is kept")
+        ->option_text("FILE");
 }
 
 void declare_conduct_options(CLI::App &app, common_arguments &given)
@@ -115,7 +119,7 @@ public:
     runtime(const arguments &given, const environment &surroundings, results &output)
         : given_(given), surroundings_(surroundings), output_(output),
           profile_(load_profile(configuration_path(surroundings), profile_name())),
-          sessions_(session_path(surroundings)),
+          sessions_(choose_session_file(given.common, surroundings, profile_)),
           log_(given.common.verbose, given.common.log_file.value_or("")), world_(real_world())
     {
         world_.announce = [](const exchange &, pause_length pause) {
