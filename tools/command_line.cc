@@ -240,3 +240,5 @@ int run_command_line(int count, char **words, const environment &surroundings, r
 
 } // namespace quillmere::tools
         choose_colors(count, words, surroundings, output);
+    } catch (const told_failure &problem) {
+        return static_cast<int>(problem.code);
