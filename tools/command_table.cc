@@ -37,6 +37,8 @@ constexpr command table[] = {
     {"attach", "Attach a folder of another account", declare_attach, run_attach},
     {"detach", "Detach such a folder again", declare_detach, run_detach, remote},
     {"doctor", "Find out what is wrong, and what to try", declare_nothing, run_doctor},
+    {"quickstart", "See it all at work on this machine, without an account", declare_nothing,
+     run_quickstart},
 };
 
 } // namespace

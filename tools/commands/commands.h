@@ -52,6 +52,7 @@ void run_changes(command_context &context);
 void run_attach(command_context &context);
 void run_detach(command_context &context);
 void run_doctor(command_context &context);
+void run_quickstart(command_context &context);
 
 /** The session for the chosen service; a failure when nobody is signed in there. */
 session require_session(command_context &context);
