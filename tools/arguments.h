@@ -19,9 +19,9 @@ struct common_arguments {
     std::optional<std::string> log_file;
     std::optional<int> timeout;
     std::optional<int> retries;
+    std::string color = "auto"; ///< one of color_words
     bool insecure = false;
     bool plain_http = false;
-    std::string color = "auto"; ///< one of color_words
     bool json = false;
     bool verbose = false;
 };
@@ -96,6 +96,16 @@ struct changes_arguments {
     bool sample = false;
 };
 
+struct completion_arguments {
+    std::string shell;
+};
+
+/** What a shell asks while a person types. */
+struct complete_arguments {
+    std::string what;   ///< "remote" or "profile"
+    std::string prefix; ///< the word so far
+};
+
 struct arguments {
     common_arguments common;
     login_arguments login;
@@ -109,6 +119,8 @@ struct arguments {
     set_arguments set;
     links_arguments links;
     changes_arguments changes;
+    completion_arguments completion;
+    complete_arguments complete;
 };
 
 } // namespace quillmere::tools

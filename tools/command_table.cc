@@ -39,6 +39,8 @@ constexpr command table[] = {
     {"doctor", "Find out what is wrong, and what to try", declare_nothing, run_doctor},
     {"quickstart", "See it all at work on this machine, without an account", declare_nothing,
      run_quickstart},
+    {"completion", "Print the completion script for a shell", declare_completion, run_completion},
+    {"__complete", "Answer a shell that completes a word", declare_complete, run_complete},
 };
 
 } // namespace

@@ -31,11 +31,12 @@ TEST_F(Usage, IsExplainedOnRequest)
     const outcome ended = home.run({"--help"});
 
     EXPECT_EQ(ended.exit_status, 0);
-    for (const char *command : {"login",  "logout",  "renew",  "login-token",
-                                "whoami", "status",  "limits", "device-status",
-                                "ls",     "stat",    "mkdir",  "create",
-                                "rm",     "mv",      "cp",     "set",
-                                "links",  "changes", "attach", "detach"})
+    for (const char *command : {"login",  "logout",     "renew",     "login-token",
+                                "whoami", "status",     "limits",    "device-status",
+                                "ls",     "stat",       "mkdir",     "create",
+                                "rm",     "mv",         "cp",        "set",
+                                "links",  "changes",    "attach",    "detach",
+                                "doctor", "quickstart", "completion"})
         EXPECT_THAT(ended.out, HasSubstr(command));
     EXPECT_THAT(ended.err, IsEmpty());
 }
