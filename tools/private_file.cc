@@ -33,7 +33,8 @@ privacy ensure_private(const descriptor &file, const std::string &name)
     if (::fstat(file.number(), &facts) != 0)
         throw file_failure("cannot examine " + name, errno);
     if (!S_ISREG(facts.st_mode))
-        throw failure(exit_code::local_file, name + " is not a regular file");
+        throw failure(exit_code::local_file, name + " is not a regular file",
+                      "remove it, or name another");
     if (facts.st_uid != ::geteuid())
         throw failure(exit_code::local_file, name + " belongs to another user",
                       "remove it and sign in again");

@@ -58,7 +58,8 @@ void session_file::save(const session &current) const
     try {
         write_private_file(path_, document.dump(2) + "\n", what, folder_);
     } catch (const nlohmann::json::exception &) {
-        throw failure(exit_code::unreadable_answer, "the service gave a token that is no text");
+        throw failure(exit_code::unreadable_answer, "the service gave a token that is no text",
+                      "run it again with --verbose to see the answer");
     }
 }
 
