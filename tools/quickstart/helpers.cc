@@ -89,9 +89,9 @@ void awaited_signals::wait_for(int readable) const
     }
 }
 
-helper::helper(const helper_command &what, const awaited_signals &signals) : signals_(signals)
+helper::helper(const helper_command &what, const awaited_signals &signals)
+    : signals_(signals), pid_(::fork())
 {
-    pid_ = ::fork();
     if (pid_ == 0)
         become(what, signals.former());
     if (pid_ < 0)

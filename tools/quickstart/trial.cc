@@ -239,9 +239,10 @@ void trial::run(const std::string &name, const std::vector<std::string> &words)
         shown.replace(at, work_.path().size(), work_word);
     print(shown);
     if (status != 0)
-        throw failure(exit_code::other, name + " " + words.front() + " ended with exit code " +
-                                            std::to_string(status),
-"what it said stands above; try quillmere doctor");
+        throw failure(exit_code::other,
+                      name + " " + words.front() + " ended with exit code " +
+                          std::to_string(status),
+                      "what it said stands above; try quillmere doctor");
 }
 
 void trial::tell(std::chrono::milliseconds time)
