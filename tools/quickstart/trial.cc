@@ -242,7 +242,7 @@ void trial::run(const std::string &name, const std::vector<std::string> &words)
         throw failure(exit_code::other,
                       name + " " + words.front() + " ended with exit code " +
                           std::to_string(status),
-                      "what it said stands above; try quillmere doctor");
+                      "what it said stands above");
 }
 
 void trial::tell(std::chrono::milliseconds time)
