@@ -181,7 +181,8 @@ private:
 void be_quick(common_arguments &given)
 {
     given.retries = 0;
-    given.timeout = 3;
+    if (!given.timeout)
+        given.timeout = 3;
 }
 
 void parse_and_run(int count, char **words, const environment &surroundings, results &output)
