@@ -30,6 +30,13 @@ if(QUILLMERE_SANITIZERS)
     add_link_options(${sanitize})
 endif()
 
+if(QUILLMERE_COUNT_COVERAGE)
+    # Counted by many threads at once, hence the atomic counters.
+    add_compile_options(--coverage -fprofile-update=atomic)
+    add_link_options(--coverage)
+    add_compile_definitions(QUILLMERE_COUNT_COVERAGE)
+endif()
+
 # quillmere_precompile(target header...): large headers of other projects, which every source of a target would read
 # anew. The sources include what they use all the same, since not every build does this.
 function(quillmere_precompile target)

@@ -1,9 +1,12 @@
 #include <quillmere.h>
+#include <stdlib.h>
 
-/* account_status CA-FILE SERVICE E-MAIL PASSWORD APPLICATION-ID APPLICATION-KEY */
+/* account_status CA-FILE SERVICE E-MAIL APPLICATION-ID APPLICATION-KEY,
+ * and the password in QUILLMERE_PASSWORD, since everybody may see a program's arguments */
 int main(int argc, char **argv)
 {
-    if (argc != 7)
+    const char *password = getenv("QUILLMERE_PASSWORD");
+    if (argc != 6 || !password)
         return 2;
     char *token = NULL, *error = NULL;
     uint64_t revision = 0;
@@ -11,7 +14,7 @@ int main(int argc, char **argv)
     urls[1] = argv[2];
     set_output_file(stderr); /* the library's log */
     api_global_init(argv[1]);
-    int32_t status = get_session_token(argv[3], argv[4], NULL, argv[5], argv[6], &token);
+    int32_t status = get_session_token(argv[3], password, NULL, argv[4], argv[5], &token);
     if (status == QM_OK)
         status = get_device_status(token, 0, &revision, &busy, &error);
     if (status == QM_OK)

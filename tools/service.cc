@@ -10,6 +10,9 @@ namespace quillmere::tools {
 
 namespace {
 
+// Far beyond any listing, and little beside the memory of a machine.
+constexpr int64_t longest_reply = 64 * 1024 * 1024; // bytes
+
 void point_library_at(const service_addresses &addresses)
 {
     urls[0] = addresses.plain.c_str();
@@ -42,6 +45,7 @@ service::service(const settings &chosen, diagnostic_log &log, const retry_world 
     // The pauses between attempts are ours to make, and only some requests may be repeated.
     set_connection_attempts(1);
     set_default_timeout(chosen.timeout_seconds);
+    set_response_limit(longest_reply);
     ssl_disabled = chosen.ca ? 0 : 1;
     api_global_init(chosen.ca ? chosen.ca->path.c_str() : nullptr);
 }
@@ -49,6 +53,7 @@ service::service(const settings &chosen, diagnostic_log &log, const retry_world 
 service::~service()
 {
     api_global_cleanup();
+    set_response_limit(0);
     set_quillmere_output_file(nullptr);
     std::copy(std::begin(former_urls_), std::end(former_urls_), urls);
 }

@@ -53,6 +53,14 @@ void quick_server::serve_clients()
     }
 }
 
+// True if the reply leaves the connection open for another request.
+bool quick_server::answer(connection &peer)
+{
+    const std::string reply = reply_to_(peer.read_request());
+    peer.send(reply);
+    return reply.find("\r\nConnection: close\r\n") == std::string::npos;
+}
+
 void quick_server::serve(descriptor client)
 {
     int yes = 1;
@@ -62,7 +70,8 @@ void quick_server::serve(descriptor client)
         if (options_.tls)
             stream.accept_tls(options_.tls.get());
         connection peer(stream, [](const request &) {});
-        peer.send(reply_to_(peer.read_request()));
+        while (answer(peer))
+            continue;
         stream.close();
     } catch (const stream_broken &) {
         // Clients may leave.

@@ -1,5 +1,5 @@
 // A server for very many requests: a few threads that answer one client after the other and keep
-// nothing of any of them.
+// nothing of any of them. A reply that does not say "Connection: close" leaves the connection open.
 #pragma once
 
 #include <sys/types.h>
@@ -29,6 +29,7 @@ public:
 private:
     void serve_clients();
     void serve(descriptor client);
+    bool answer(connection &peer);
 
     replier reply_to_;
     server_options options_;

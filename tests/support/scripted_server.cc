@@ -101,8 +101,15 @@ std::vector<request> scripted_server::requests() const
 
 size_t scripted_server::connections() const
 {
-    std::lock_guard<std::mutex> lock(mutex_);
+    std::unique_lock<std::mutex> lock(mutex_);
+    changed_.wait_for(lock, patience, [this] { return stopping_ || !somebody_knocks(); });
     return connections_;
+}
+
+bool scripted_server::somebody_knocks() const
+{
+    pollfd wait = {listener_.number(), POLLIN, 0};
+    return ::poll(&wait, 1, 0) > 0;
 }
 
 size_t scripted_server::handshake_failures() const
@@ -139,7 +146,7 @@ bool scripted_server::wait_until_idle()
         for (const worker &each : workers_)
             if (!each.finished)
                 return false;
-        return true;
+        return !somebody_knocks();
     });
     join_finished();
     return idle;
@@ -152,21 +159,24 @@ void scripted_server::accept_clients()
         ::poll(waits, 2, -1);
         if (waits[1].revents)
             return;
-        int kind = SOCK_NONBLOCK | SOCK_CLOEXEC;
-        descriptor client(::accept4(listener_.number(), nullptr, nullptr, kind));
-        if (client)
-            start_worker(std::move(client));
+        // Thousands of connections must not leave thousands of threads behind.
+        join_finished();
+        take_client();
     }
 }
 
-void scripted_server::start_worker(descriptor socket)
+// A client is counted as soon as it no longer waits at the listener, so that it is seen at one of
+// the two places at any moment.
+void scripted_server::take_client()
 {
-    // Thousands of connections must not leave thousands of threads behind.
-    join_finished();
-    int yes = 1;
-    ::setsockopt(socket.number(), IPPROTO_TCP, TCP_NODELAY, &yes, sizeof yes);
     {
         std::lock_guard<std::mutex> lock(mutex_);
+        int kind = SOCK_NONBLOCK | SOCK_CLOEXEC;
+        descriptor socket(::accept4(listener_.number(), nullptr, nullptr, kind));
+        if (!socket)
+            return;
+        int yes = 1;
+        ::setsockopt(socket.number(), IPPROTO_TCP, TCP_NODELAY, &yes, sizeof yes);
         ++connections_;
         worker &own = workers_.emplace_back();
         own.thread = std::thread(

@@ -110,6 +110,8 @@ public:
     std::string base_url(const std::string &host) const;
 
     std::vector<request> requests() const;
+
+    // Every client counts that has reached the listener, even if it left at once.
     size_t connections() const;
 
     // A client that dislikes the name alone, not the chain, may finish the handshake and leave
@@ -131,7 +133,8 @@ private:
 
     void listen();
     void accept_clients();
-    void start_worker(descriptor socket);
+    void take_client();
+    bool somebody_knocks() const;
     void serve(descriptor socket, const connection_script &script);
     connection_script take_script();
     void finish(worker &own);
@@ -144,7 +147,7 @@ private:
     uint16_t port_;
 
     mutable std::mutex mutex_; // guards everything below but the acceptor
-    std::condition_variable changed_;
+    mutable std::condition_variable changed_;
     bool stopping_ = false;
     std::deque<connection_script> scripts_;
     std::vector<request> requests_;

@@ -59,6 +59,17 @@ TEST_F(CommandLine, PrintsResultsAloneOnStandardOutput)
     EXPECT_THAT(ended.err, IsEmpty());
 }
 
+TEST_F(CommandLine, TakesNoReplyWithoutEnd)
+{
+    const std::string too_long(64 * 1024 * 1024, ' ');
+    server.answer(xml_reply(too_long + "<response><result>Success</result></response>"));
+
+    const outcome ended = home.run({"limits", "--retries", "0", "--verbose"});
+
+    EXPECT_NE(ended.exit_status, 0);
+    EXPECT_THAT(ended.err, HasSubstr("Response is longer than the limit of 67108864 bytes."));
+}
+
 TEST_F(CommandLine, PrintsResultsAsJson)
 {
     server.answer(limits_reply);

@@ -1,0 +1,12 @@
+// The operations that are measured, each called once and its results released.
+#pragma once
+
+namespace quillmere_bench {
+
+// They end the program when the operation does not succeed: what failed must not pass for quick.
+void call_folder_info();
+void call_user_info();
+void call_folder_content();
+void call_device_changes();
+
+} // namespace quillmere_bench

@@ -1,0 +1,198 @@
+// What a request costs its process beside raw libcurl with the same options, which discards the
+// body, and one pass of expat over the reply: over TLS to a server in another process.
+//
+//   request_bench BUNDLE      the system's file of certificate authorities
+#include <cstdio>
+#include <cstdlib>
+#include <functional>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "calls.h"
+#include "measured.h"
+#include "quillmere.h"
+#include "references.h"
+#include "replies.h"
+#include "support/certificates.h"
+#include "support/library_fixture.h"
+#include "support/quick_server.h"
+#include "support/temporary_folder.h"
+
+namespace {
+
+using namespace quillmere_bench;
+using quillmere_test::quick_server_process;
+using quillmere_test::request;
+
+struct subject {
+    const char *name;
+    void (*call)();
+    const char *path;
+    std::string reply;
+};
+
+class bench {
+public:
+    bench(std::string base, std::string one_certificate, std::string bundle)
+        : base_(std::move(base)), one_certificate_(std::move(one_certificate)),
+          bundle_(std::move(bundle))
+    {
+        urls[1] = base_.c_str();
+    }
+
+    void run()
+    {
+        start(one_certificate_);
+        print_heading();
+        measure_new_connections();
+        measure_kept_connections();
+        measure_threads();
+        start(bundle_);
+        measure_bundle();
+        api_global_cleanup();
+    }
+
+private:
+    void start(const std::string &ca_path)
+    {
+        api_global_cleanup();
+        api_global_init(ca_path.c_str());
+        set_default_timeout(60);
+        ca_path_ = ca_path;
+    }
+
+    std::string url_of(const subject &what) const { return base_ + what.path + "?version=2.15"; }
+
+    void raw_call(const subject &what) const
+    {
+        raw_exchange(url_of(what), ca_path_);
+        parse_once(what.reply.data(), what.reply.size());
+    }
+
+    void measure_new_connections()
+    {
+        measure({"`get_folder_info`, new connection", 1.03, folder.call, [&] { raw_call(folder); },
+                 50});
+        measure({"`get_user_info`, new connection", 1.03, user.call, [&] { raw_call(user); }, 50});
+        measure({"`get_folder_content`, 1,000 entries, new connection", 1.30, content.call,
+                 [&] { raw_call(content); }, 20});
+        measure({"`get_device_changes`, 500 entries, new connection", 1.15, changes.call,
+                 [&] { raw_call(changes); }, 20});
+        measure({"`get_response_from_url`, new connection", 0.85, [&] { plain_exchange(); },
+                 [&] { raw_exchange(url_of(folder), ca_path_); }, 50});
+    }
+
+    void plain_exchange() const
+    {
+        char *response = nullptr;
+        uint64_t length = 0;
+        if (get_response_from_url(url_of(folder).c_str(), nullptr, 0, &response, &length, 0) != 200)
+            std::exit(1);
+        std::free(response);
+    }
+
+    void measure_bundle()
+    {
+        measure({"`get_folder_info`, full bundle, beside libcurl alone", 0.05, folder.call,
+                 [&] { raw_exchange(url_of(folder), ca_path_); }, 10});
+    }
+
+    void measure_kept_connections()
+    {
+        set_connection_reuse(1);
+        measure_kept(folder, 1.10, 500);
+        measure_kept(content, 1.45, 20);
+        // A round begins with a new connection for either, since switching closes the kept one.
+        auto hundreds = [&](int32_t kept) {
+            set_connection_reuse(kept);
+            for (int call = 0; call < 200; ++call)
+                folder.call();
+        };
+        measure({"200 times `get_folder_info`, kept connection beside new ones", 0.05,
+                 [&] { hundreds(1); }, [&] { hundreds(0); }});
+        set_connection_reuse(0);
+    }
+
+    void measure_kept(const subject &what, double at_most, unsigned calls) const
+    {
+        raw_handle handle = new_raw_handle(url_of(what), ca_path_);
+        measure({std::string("`") + what.name + "`, kept connection", at_most, what.call,
+                 [&] {
+                     perform(handle.get());
+                     parse_once(what.reply.data(), what.reply.size());
+                 },
+                 calls});
+    }
+
+    void measure_threads()
+    {
+        constexpr unsigned calls = 64;
+        auto on_threads = [&](unsigned count) {
+            std::vector<std::thread> threads;
+            for (unsigned number = 0; number < count; ++number)
+                threads.emplace_back([&, each = calls / count] {
+                    for (unsigned call = 0; call < each; ++call)
+                        folder.call();
+                });
+            for (std::thread &each : threads)
+                each.join();
+        };
+        for (unsigned count : {2u, 4u, 8u})
+            measure({"64 calls on " + std::to_string(count) + " threads beside 1", 1.05,
+                     [&, count] { on_threads(count); }, [&] { on_threads(1); }, 1});
+    }
+
+    std::string base_;
+    std::string one_certificate_;
+    std::string bundle_;
+    std::string ca_path_;
+
+public:
+    subject folder = {"get_folder_info", call_folder_info, get_folder_info_uri, folder_record()};
+    subject user = {"get_user_info", call_user_info, get_user_info_uri, user_record()};
+    subject content = {"get_folder_content", call_folder_content, get_folder_content_uri,
+                       listing(1000)};
+    subject changes = {"get_device_changes", call_device_changes, get_device_changes_uri,
+                       change_feed(500)};
+};
+
+std::string kept_reply(const std::string &body)
+{
+    return "HTTP/1.1 200 OK\r\nContent-Type: text/xml\r\nContent-Length: " +
+           std::to_string(body.size()) + "\r\n\r\n" + body;
+}
+
+// Static replies, made once: what the server costs is none of the client's.
+std::function<std::string(const request &)> replies()
+{
+    return [folder = kept_reply(folder_record()), user = kept_reply(user_record()),
+            content = kept_reply(listing(1000)),
+            changes = kept_reply(change_feed(500))](const request &asked) {
+        std::string path = asked.path();
+        if (path == get_user_info_uri)
+            return user;
+        if (path == get_folder_content_uri)
+            return content;
+        return path == get_device_changes_uri ? changes : folder;
+    };
+}
+
+} // namespace
+
+int main(int argc, char **argv)
+{
+    if (argc != 2) {
+        std::fprintf(stderr, "usage: request_bench BUNDLE\n");
+        return 2;
+    }
+    quillmere_test::proxyless_environment environment;
+    quillmere_test::temporary_folder folder;
+    std::string root = quillmere_test::test_root_path();
+    std::string bundle = folder.write("bundle.pem", quillmere_test::content_of(argv[1]) +
+                                                        quillmere_test::content_of(root));
+
+    quick_server_process server(replies(),
+                                quillmere_test::tls_with(quillmere_test::loopback_certificate()));
+    bench(server.base_url(), root, bundle).run();
+}
