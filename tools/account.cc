@@ -103,7 +103,8 @@ remote_entry find_movable(const remote_tree &tree, const std::string &path, cons
 {
     remote_entry found = find_entry(tree, path);
     if (found.is_root())
-        throw failure(exit_code::usage, std::string("the account's root cannot be ") + verb);
+        throw failure(exit_code::usage, std::string("the account's root cannot be ") + verb,
+                      "name something in it");
     return found;
 }
 

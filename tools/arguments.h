@@ -14,9 +14,12 @@ struct common_arguments {
     std::optional<std::string> emulator;
     std::optional<std::string> profile;
     std::optional<std::string> ca_file;
+    std::optional<std::string> proxy;
+    std::optional<std::string> session_file;
     std::optional<std::string> log_file;
     std::optional<int> timeout;
     std::optional<int> retries;
+    std::string color = "auto"; ///< one of color_words
     bool insecure = false;
     bool plain_http = false;
     bool json = false;
@@ -93,6 +96,16 @@ struct changes_arguments {
     bool sample = false;
 };
 
+struct completion_arguments {
+    std::string shell;
+};
+
+/** What a shell asks while a person types. */
+struct complete_arguments {
+    std::string what;   ///< "remote" or "profile"
+    std::string prefix; ///< the word so far
+};
+
 struct arguments {
     common_arguments common;
     login_arguments login;
@@ -106,6 +119,8 @@ struct arguments {
     set_arguments set;
     links_arguments links;
     changes_arguments changes;
+    completion_arguments completion;
+    complete_arguments complete;
 };
 
 } // namespace quillmere::tools

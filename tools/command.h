@@ -28,11 +28,18 @@ struct command_context {
     results &output;
 };
 
+/** What the words behind a command are, for a shell that completes them. */
+enum class operand_kind { none, remote, local_and_remote };
+
 struct command {
     const char *name;
     const char *summary;
     void (*declare)(CLI::App &options, arguments &given);
-    void (*run)(command_context &context); ///< throws failure
+    void (*run)(command_context &context); ///< throws failure, or told_failure
+    operand_kind operands = operand_kind::none;
+
+    /** Not one that people type. */
+    bool is_hidden() const { return name[0] == '_'; }
 };
 
 struct command_range {

@@ -6,6 +6,7 @@
 #include <CLI/CLI.hpp>
 #include <quillmere.h>
 
+#include "color.h"
 #include "command.h"
 #include "console.h"
 #include "failure.h"
@@ -40,6 +41,10 @@ void declare_service_options(CLI::App &app, common_arguments &given)
         ->excludes(ca_file);
     app.add_flag("--plain-http", given.plain_http,
                  "Leave requests unencrypted that the service takes so");
+    app.add_option("--proxy", given.proxy, "Proxy on the way to the service (http://host:port)")
+        ->option_text("URL");
+    app.add_option("--session-file", given.session_file, "Where the session is kept")
+        ->option_text("FILE");
 }
 
 void declare_conduct_options(CLI::App &app, common_arguments &given)
@@ -51,6 +56,10 @@ void declare_conduct_options(CLI::App &app, common_arguments &given)
         ->option_text("COUNT")
         ->check(CLI::Range(0, 1000));
     app.add_flag("--json", given.json, "Print results and errors as JSON");
+    app.add_option("--color", given.color, "Whether text is coloured: auto, always or never")
+        ->option_text("WHEN")
+        ->check(CLI::IsMember(
+            std::vector<std::string>(std::begin(color_words), std::end(color_words))));
     app.add_flag("-v,--verbose", given.verbose, "Show the exchanges on standard error");
     app.add_option("--log-file", given.log_file, "Append the exchanges to a file")
         ->option_text("FILE");
@@ -60,6 +69,8 @@ void declare_commands(CLI::App &app, arguments &given, const command *&chosen)
 {
     for (const command &row : commands()) {
         CLI::App *const options = app.add_subcommand(row.name, row.summary);
+        if (row.is_hidden())
+            options->group("");
         options->fallthrough(); // common options may stand behind the command too
         row.declare(*options, given);
         options->callback([&chosen, &row] { chosen = &row; });
@@ -110,7 +121,7 @@ public:
     runtime(const arguments &given, const environment &surroundings, results &output)
         : given_(given), surroundings_(surroundings), output_(output),
           profile_(load_profile(configuration_path(surroundings), profile_name())),
-          sessions_(session_path(surroundings)),
+          sessions_(choose_session_file(given.common, surroundings, profile_)),
           log_(given.common.verbose, given.common.log_file.value_or("")), world_(real_world())
     {
         world_.announce = [](const exchange &, pause_length pause) {
@@ -166,20 +177,26 @@ private:
     std::optional<service> service_;
 };
 
+// Of what a shell asks while a person waits for the next letter.
+void be_quick(common_arguments &given)
+{
+    given.retries = 0;
+    if (!given.timeout)
+        given.timeout = 3;
+}
+
 void parse_and_run(int count, char **words, const environment &surroundings, results &output)
 {
     CLI::App app("The command line of the cloud file storage service.", "quillmere");
-    app.set_version_flag("--version", version_text());
-    app.option_defaults()->take_last();
     arguments given;
     const command *chosen = nullptr;
-    declare_service_options(app, given.common);
-    declare_conduct_options(app, given.common);
-    declare_commands(app, given, chosen);
+    declare_program(app, given, chosen);
 
     const command *const asked = parse(app, count, words, chosen, output);
     if (asked == nullptr)
         return;
+    if (asked->is_hidden())
+        be_quick(given.common);
     runtime(given, surroundings, output).run(*asked);
 }
 
@@ -192,29 +209,50 @@ result_format format_in(int count, char **words)
     return result_format::text;
 }
 
+void choose_colors(int count, char **words, const environment &surroundings, results &output)
+{
+    const color_choice choice = color_choice_in(count, words);
+    // Whoever reads JSON reads what is beside it with a program, too.
+    const bool readable = output.format() == result_format::text;
+    output.set_colors(readable && wants_color(choice, surroundings, output.is_terminal()));
+    color_messages(readable && wants_color(choice, surroundings, ::isatty(STDERR_FILENO) == 1));
+}
+
 int report(const failure &problem, results &output)
 {
     try {
         if (output.format() == result_format::json)
             output.write(json_of(problem));
         else
-            write_all(STDERR_FILENO, line_of(problem));
+            complain(problem);
     } catch (const failure &unwritable) {
-        write_all(STDERR_FILENO, line_of(unwritable));
+        complain(unwritable);
     }
     return static_cast<int>(problem.code);
 }
 
 } // namespace
 
+void declare_program(CLI::App &app, arguments &given, const command *&chosen)
+{
+    app.set_version_flag("--version", version_text());
+    app.option_defaults()->take_last();
+    declare_service_options(app, given.common);
+    declare_conduct_options(app, given.common);
+    declare_commands(app, given, chosen);
+}
+
 int run_command_line(int count, char **words, const environment &surroundings, results &output)
 {
     try {
         output.set_format(format_in(count, words));
+        choose_colors(count, words, surroundings, output);
         parse_and_run(count, words, surroundings, output);
         return static_cast<int>(exit_code::done);
     } catch (const failure &problem) {
         return report(problem, output);
+    } catch (const told_failure &problem) {
+        return static_cast<int>(problem.code);
     } catch (const std::exception &problem) {
         return report(failure(exit_code::other, problem.what()), output);
     }

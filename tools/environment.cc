@@ -23,7 +23,8 @@ std::string environment::directory(const char *variable, const std::string &belo
     if (!home)
         throw failure(exit_code::local_file,
                       std::string("cannot tell where files belong: neither ") + variable +
-                          " nor HOME is set");
+                          " nor HOME is set",
+                      "set HOME to your folder");
     return *home + "/" + below_home;
 }
 

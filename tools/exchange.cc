@@ -30,6 +30,36 @@ enum transport_code {
     ca_file_unusable = 77
 };
 
+/** What helps against the service's refusals, where more helps than to ask for something else. */
+struct refusal_advice {
+    std::int32_t number;
+    const char *advice;
+};
+constexpr refusal_advice refusals[] = {
+    {107, "check the e-mail address and the password"},
+    {108, "check the application id: --app-id, QUILLMERE_APP_ID or app_id"},
+    {109, "check the application key, and the password"},
+    {112, "look at what is there with: quillmere ls"},
+    {113, "look at what is there with: quillmere ls"},
+    {114, "it belongs to another account, or is private"},
+    {115, "choose another name"},
+    {116, "choose a folder that is not as deep"},
+    {117, "make room with: quillmere rm; quillmere whoami shows what is used"},
+    {119, "wait until there is bandwidth again; quillmere whoami shows it"},
+    {120, "choose another destination"},
+    {123, "try again tomorrow"},
+    {127, "somebody changed it meanwhile: look at it, then send it again"},
+    {128, "send it again: it may have changed while it was read"},
+};
+
+const char *advice_against(std::int32_t number)
+{
+    for (const refusal_advice &each : refusals)
+        if (each.number == number)
+            return each.advice;
+    return "";
+}
+
 bool is_permanent(int code)
 {
     return code == unsupported_protocol || code == malformed_url || code == certificate_refused ||
@@ -101,9 +131,11 @@ failure refusal(const exchange &ended, const std::string &action)
                        "sign in again with: quillmere login");
     if (ended.status > 0)
         return failure(exit_code::refused,
-                       action + " failed: " + std::to_string(ended.status) + ": " + said);
+                       action + " failed: " + std::to_string(ended.status) + ": " + said,
+                       advice_against(ended.status));
     return failure(exit_code::refused,
-                   action + " failed: refused without a usable error number: " + said);
+                   action + " failed: refused without a usable error number: " + said,
+                   "run it again with --verbose to see the answer");
 }
 
 failure failure_without_status(const exchange &ended, const std::string &action,
@@ -119,7 +151,8 @@ failure failure_without_status(const exchange &ended, const std::string &action,
         return answer_failure(exit_code::unreadable_answer, ended, action,
                               "the service's answer is not well-formed XML");
     case QM_SIGNATURE_FAILED:
-        return failure(exit_code::other, action + " failed: the request could not be signed");
+        return failure(exit_code::other, action + " failed: the request could not be signed",
+                       "check the installation with: quillmere doctor");
     default:
         return refusal(ended, action);
     }

@@ -1,5 +1,6 @@
 #include "failure.h"
 
+#include <cerrno>
 #include <system_error>
 
 #include <nlohmann/json.hpp>
@@ -7,6 +8,38 @@
 #include "text.h"
 
 namespace quillmere::tools {
+
+namespace {
+
+const char *advice_against(int error_number)
+{
+    switch (error_number) {
+    case ENOENT:
+    case ENAMETOOLONG:
+    case ELOOP:
+        return "check the path";
+    case EACCES:
+    case EPERM:
+        return "check who may read and write there";
+    case EISDIR:
+        return "name a file instead";
+    case ENOTDIR:
+        return "name a folder on the way that is one";
+    case EEXIST:
+        return "choose a name that is free";
+    case EROFS:
+        return "choose a place that can be written";
+    case ENOSPC:
+    case EDQUOT:
+        return "make room, then run it again";
+    case EFBIG:
+        return "is it the right file?";
+    default:
+        return "";
+    }
+}
+
+} // namespace
 
 const char *kind_of(exit_code code)
 {
@@ -39,6 +72,8 @@ const char *kind_of(exit_code code)
 
 failure file_failure(const std::string &what, int error_number, std::string advice)
 {
+    if (advice.empty())
+        advice = advice_against(error_number);
     return failure(exit_code::local_file,
                    what + ": " + std::generic_category().message(error_number), std::move(advice));
 }

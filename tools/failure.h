@@ -41,7 +41,13 @@ struct failure : std::exception {
     std::optional<std::int32_t> status; ///< of the operation, when there was one
 };
 
-/** A failure of a call on a local file, told with the reason that errno gives. */
+/** Thrown by a command that has told by itself what failed: nothing more is printed. */
+struct told_failure {
+    exit_code code;
+};
+
+/** A failure of a call on a local file, told with the reason that errno gives, and without other
+ * advice with what helps against that. */
 failure file_failure(const std::string &what, int error_number, std::string advice = {});
 
 /**

@@ -33,7 +33,8 @@ privacy ensure_private(const descriptor &file, const std::string &name)
     if (::fstat(file.number(), &facts) != 0)
         throw file_failure("cannot examine " + name, errno);
     if (!S_ISREG(facts.st_mode))
-        throw failure(exit_code::local_file, name + " is not a regular file");
+        throw failure(exit_code::local_file, name + " is not a regular file",
+                      "remove it, or name another");
     if (facts.st_uid != ::geteuid())
         throw failure(exit_code::local_file, name + " belongs to another user",
                       "remove it and sign in again");
@@ -47,8 +48,8 @@ privacy ensure_private(const descriptor &file, const std::string &name)
     return privacy::repaired;
 }
 
-// The directories above are made as the user's other directories are; the last one is ours.
-void make_private_directory(const std::filesystem::path &directory)
+// The directories above are made as the user's other directories are; the last one is private.
+void make_private_directory(const std::filesystem::path &directory, folder_owner owner)
 {
     std::error_code problem;
     std::filesystem::create_directories(directory.parent_path(), problem);
@@ -57,7 +58,8 @@ void make_private_directory(const std::filesystem::path &directory)
     struct stat facts = {};
     if (errno != EEXIST || ::stat(directory.c_str(), &facts) != 0 || !S_ISDIR(facts.st_mode))
         throw file_failure("cannot make the directory " + directory.string(), errno);
-    if ((facts.st_mode & 077) != 0 && ::chmod(directory.c_str(), 0700) != 0)
+    if (owner == folder_owner::program && (facts.st_mode & 077) != 0 &&
+        ::chmod(directory.c_str(), 0700) != 0)
         throw file_failure("cannot protect the directory " + directory.string(), errno);
 }
 
@@ -128,10 +130,13 @@ std::optional<private_text> read_private_file(const std::string &path, const std
     return private_text{contents_of(file, name), found};
 }
 
-void write_private_file(const std::string &path, const std::string &text, const std::string &what)
+void write_private_file(const std::string &path, const std::string &text, const std::string &what,
+                        folder_owner folder)
 {
-    const std::filesystem::path directory = std::filesystem::path(path).parent_path();
-    make_private_directory(directory);
+    std::filesystem::path directory = std::filesystem::path(path).parent_path();
+    if (directory.empty()) // of a path that is a name alone
+        directory = ".";
+    make_private_directory(directory, folder);
 
     // A signal that ended the process here would leave the new file behind.
     const interrupts_held whole;

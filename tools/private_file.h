@@ -27,11 +27,16 @@ struct private_text {
  */
 std::optional<private_text> read_private_file(const std::string &path, const std::string &what);
 
+/** Whose the directory of a private file is. The program's own is kept from other users; the mode
+ * of another is none of its business. */
+enum class folder_owner { program, somebody };
+
 /**
  * Replaces a private file, with mode 0600, in a directory that is made with mode 0700. After a
  * crash the old contents are there or the new ones, never a part.
  */
-void write_private_file(const std::string &path, const std::string &text, const std::string &what);
+void write_private_file(const std::string &path, const std::string &text, const std::string &what,
+                        folder_owner folder = folder_owner::program);
 
 /** Makes a new file with mode 0600, in a directory that is there; a failure when there is a file of
  * that name already. */

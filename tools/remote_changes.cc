@@ -28,7 +28,8 @@ remote_entry made_entry(const remote_entry &model, char *key, const std::string 
     const heap_text owned(key);
     if (key == nullptr || *key == '\0')
         throw failure(exit_code::partly_done,
-                      action + " succeeded, but the service did not tell the new key");
+                      action + " succeeded, but the service did not tell the new key",
+                      "look for it with: quillmere ls");
     remote_entry made = model;
     made.key = key;
     return made;

@@ -106,7 +106,8 @@ std::optional<remote_entry> find_child(const remote_tree &tree, const remote_ent
 void require_folder(const remote_entry &entry)
 {
     if (!entry.is_folder())
-        throw failure(exit_code::refused, entry.name + " is a file, not a folder");
+        throw failure(exit_code::refused, entry.name + " is a file, not a folder",
+                      "look at what is there with: quillmere ls");
 }
 
 } // namespace
@@ -155,13 +156,15 @@ remote_entry find_file(const remote_tree &tree, const std::string &path)
 {
     remote_entry found = find_entry(tree, path);
     if (found.is_folder())
-        throw failure(exit_code::refused, path + " is a folder, not a file");
+        throw failure(exit_code::refused, path + " is a folder, not a file",
+                      "name a file in it; quillmere ls lists them");
     return found;
 }
 
 void throw_missing(const std::string &path)
 {
-    throw failure(exit_code::refused, "there is no " + path);
+    throw failure(exit_code::refused, "there is no " + path,
+                  "look at what is there with: quillmere ls");
 }
 
 std::optional<std::string> key_in(const std::string &path)

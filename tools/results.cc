@@ -5,6 +5,7 @@
 
 #include <fcntl.h>
 
+#include "color.h"
 #include "failure.h"
 #include "text.h"
 
@@ -12,7 +13,12 @@ namespace quillmere::tools {
 
 namespace {
 
-std::string shown(const nlohmann::ordered_json &value, bool for_terminal)
+std::string as_shown(const std::string &text, text_style style)
+{
+    return style == text_style::plain ? text : escape_controls(text);
+}
+
+std::string shown(const nlohmann::ordered_json &value, text_style style)
 {
     if (value.is_null())
         return "-";
@@ -20,8 +26,7 @@ std::string shown(const nlohmann::ordered_json &value, bool for_terminal)
         return value.get<bool>() ? "yes" : "no";
     if (!value.is_string())
         return value.dump();
-    const auto &text = value.get_ref<const std::string &>();
-    return for_terminal ? escape_controls(text) : text;
+    return as_shown(value.get_ref<const std::string &>(), style);
 }
 
 nlohmann::ordered_json object_of(const std::vector<fact> &facts)
@@ -46,14 +51,14 @@ const nlohmann::ordered_json *value_of(const std::vector<fact> &row, std::string
     return nullptr;
 }
 
-text_column text_column_of(const result_table &whole, const column &wanted, bool for_terminal)
+text_column text_column_of(const result_table &whole, const column &wanted, text_style style)
 {
     text_column made;
     made.cells.push_back(wanted.label);
     bool only_numbers = true;
     for (const std::vector<fact> &row : whole.rows) {
         const nlohmann::ordered_json *const value = value_of(row, wanted.key);
-        made.cells.push_back(value == nullptr ? "-" : shown(*value, for_terminal));
+        made.cells.push_back(value == nullptr ? "-" : shown(*value, style));
         if (value == nullptr || value->is_null())
             continue;
         made.numbers = true;
@@ -65,6 +70,19 @@ text_column text_column_of(const result_table &whole, const column &wanted, bool
     return made;
 }
 
+std::string with_paint(const std::string &text, paint how, text_style style)
+{
+    return style == text_style::colored ? painted(text, how) : text;
+}
+
+/** What a row is called, as it is shown. */
+std::string name_of(const std::vector<fact> &row, const std::string &name, text_style style)
+{
+    const nlohmann::ordered_json *const kind = value_of(row, "kind");
+    const bool folder = kind != nullptr && *kind == "folder";
+    return folder ? with_paint(name, paint::folder, style) : name;
+}
+
 std::string padded(const text_column &column, std::size_t line)
 {
     const std::string &cell = column.cells[line];
@@ -74,7 +92,7 @@ std::string padded(const text_column &column, std::size_t line)
 
 } // namespace
 
-std::string facts_as_text(const std::vector<fact> &facts, bool for_terminal)
+std::string facts_as_text(const std::vector<fact> &facts, text_style style)
 {
     std::size_t widest = 0;
     for (const fact &each : facts)
@@ -87,21 +105,21 @@ std::string facts_as_text(const std::vector<fact> &facts, bool for_terminal)
             continue;
         lines += each.label;
         lines.append(widest - columns(each.label) + 2, ' ');
-        lines += shown(each.value, for_terminal) + "\n";
+        lines += shown(each.value, style) + "\n";
     }
     return lines;
 }
 
 std::string facts_as_json(const std::vector<fact> &facts) { return json_line(object_of(facts)); }
 
-std::string groups_as_text(const std::vector<fact_group> &groups, bool for_terminal)
+std::string groups_as_text(const std::vector<fact_group> &groups, text_style style)
 {
     std::vector<fact> known;
     for (const fact_group &group : groups)
         for (const fact &each : group.facts)
             if (!each.value.is_null() && each.value != "")
                 known.push_back(each);
-    return facts_as_text(known, for_terminal);
+    return facts_as_text(known, style);
 }
 
 std::string groups_as_json(const std::vector<fact_group> &groups)
@@ -112,18 +130,25 @@ std::string groups_as_json(const std::vector<fact_group> &groups)
     return json_line(document);
 }
 
-std::string table_as_text(const result_table &shown, bool for_terminal)
+std::string table_as_text(const result_table &shown, text_style style)
 {
     if (shown.rows.empty())
         return {};
     std::vector<text_column> all;
     for (const column &each : shown.columns)
-        all.push_back(text_column_of(shown, each, for_terminal));
+        all.push_back(text_column_of(shown, each, style));
 
     std::string lines;
     for (std::size_t line = 0; line <= shown.rows.size(); ++line) {
+        std::string before;
         for (const text_column &each : all)
-            lines += &each == &all.back() ? each.cells[line] + "\n" : padded(each, line) + "  ";
+            if (&each != &all.back())
+                before += padded(each, line) + "  ";
+        const std::string &last = all.back().cells[line];
+        if (line == 0)
+            lines += with_paint(before + last, paint::heading, style) + "\n";
+        else
+            lines += before + name_of(shown.rows[line - 1], last, style) + "\n";
     }
     return lines;
 }
@@ -140,28 +165,35 @@ std::string table_as_json(const std::vector<fact> &about, const result_table &sh
 results::results() : output_(::fcntl(STDOUT_FILENO, F_DUPFD_CLOEXEC, STDERR_FILENO + 1))
 {
     terminal_ = ::isatty(output_.number()) == 1;
+    set_colors(false);
     const descriptor nowhere(::open("/dev/null", O_WRONLY | O_CLOEXEC));
     if (nowhere)
         ::dup2(nowhere.number(), STDOUT_FILENO);
 }
 
+void results::set_colors(bool colored)
+{
+    style_ = terminal_ ? text_style::terminal : text_style::plain;
+    if (colored)
+        style_ = text_style::colored;
+}
+
 void results::facts(const std::vector<fact> &facts)
 {
-    write(format_ == result_format::json ? facts_as_json(facts) : facts_as_text(facts, terminal_));
+    write(format_ == result_format::json ? facts_as_json(facts) : facts_as_text(facts, style_));
 }
 
 void results::groups(const std::vector<fact_group> &groups)
 {
-    write(format_ == result_format::json ? groups_as_json(groups)
-                                         : groups_as_text(groups, terminal_));
+    write(format_ == result_format::json ? groups_as_json(groups) : groups_as_text(groups, style_));
 }
 
 void results::rows(const std::vector<fact> &about, const result_table &shown)
 {
     if (format_ == result_format::json)
         return write(table_as_json(about, shown));
-    const std::string above = facts_as_text(about, terminal_);
-    const std::string below = table_as_text(shown, terminal_);
+    const std::string above = facts_as_text(about, style_);
+    const std::string below = table_as_text(shown, style_);
     write(above + (above.empty() || below.empty() ? "" : "\n") + below);
 }
 
@@ -170,14 +202,14 @@ void results::lines(const std::vector<std::string> &lines, const result_table &s
     if (format_ == result_format::json)
         return write(table_as_json({}, shown));
     std::string text;
-    for (const std::string &line : lines)
-        text += (terminal_ ? escape_controls(line) : line) + "\n";
+    for (std::size_t i = 0; i < lines.size(); ++i)
+        text += name_of(shown.rows[i], as_shown(lines[i], style_), style_) + "\n";
     write(text);
 }
 
 void results::sentence(const std::string &sentence, const std::vector<fact> &facts)
 {
-    const std::string line = (terminal_ ? escape_controls(sentence) : sentence) + "\n";
+    const std::string line = as_shown(sentence, style_) + "\n";
     write(format_ == result_format::json ? facts_as_json(facts) : line);
 }
 

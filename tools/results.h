@@ -39,20 +39,25 @@ struct result_table {
 
 enum class result_format { text, json };
 
+/** How text is meant to be read: taken up by other programs as it is, shown by a terminal that must
+ * not obey what the service sent, or shown in colours as well. */
+enum class text_style { plain, terminal, colored };
+
 /** The facts as lines of label and value, the values below one another. */
-std::string facts_as_text(const std::vector<fact> &facts, bool for_terminal);
+std::string facts_as_text(const std::vector<fact> &facts, text_style style);
 
 /** The facts as one JSON object. */
 std::string facts_as_json(const std::vector<fact> &facts);
 
 /** The groups as lines of label and value, without those that nothing is known of. */
-std::string groups_as_text(const std::vector<fact_group> &groups, bool for_terminal);
+std::string groups_as_text(const std::vector<fact_group> &groups, text_style style);
 
 /** The groups as an object of objects. */
 std::string groups_as_json(const std::vector<fact_group> &groups);
 
-/** The rows below a line of headings, numbers to the right; nothing for no rows. */
-std::string table_as_text(const result_table &shown, bool for_terminal);
+/** The rows below a line of headings, numbers to the right; nothing for no rows. What is a folder
+ * is coloured as one. */
+std::string table_as_text(const result_table &shown, text_style style);
 
 /** An object of the facts that are told about the whole, and an array of the rows. */
 std::string table_as_json(const std::vector<fact> &about, const result_table &shown);
@@ -65,13 +70,18 @@ public:
     void set_format(result_format format) { format_ = format; }
     result_format format() const { return format_; }
 
+    /** Whether it is shown by a terminal. */
+    bool is_terminal() const { return terminal_; }
+    void set_colors(bool colored);
+    text_style style() const { return style_; }
+
     void facts(const std::vector<fact> &facts);
     void groups(const std::vector<fact_group> &groups);
 
     /** What is told about the whole stands above the rows. */
     void rows(const std::vector<fact> &about, const result_table &shown);
 
-    /** Lines for people; the rows for scripts. */
+    /** A line for each row for people; the rows for scripts. */
     void lines(const std::vector<std::string> &lines, const result_table &shown);
 
     /** A sentence for people; its facts for scripts. */
@@ -83,6 +93,7 @@ public:
 private:
     descriptor output_;
     bool terminal_ = false;
+    text_style style_ = text_style::plain;
     result_format format_ = result_format::text;
 };
 

@@ -14,6 +14,8 @@ namespace {
 
 enum class echo { shown, hidden };
 
+constexpr const char *one_line = "it is one line of text, and nothing else";
+
 /** The next byte in letter, or false at the end. */
 bool read_letter(int number, char &letter, const std::string &name)
 {
@@ -29,10 +31,12 @@ bool read_letter(int number, char &letter, const std::string &name)
 void append_or_fail(secret_text &text, char letter, const std::string &name)
 {
     if (letter == '\0')
-        throw failure(exit_code::local_file, "the " + name + " contains a NUL byte");
+        throw failure(exit_code::local_file, "the " + name + " contains a NUL byte", one_line);
     if (!text.append(letter))
-        throw failure(exit_code::local_file, "the " + name + " is longer than " +
-                                                 std::to_string(secret_text::longest) + " bytes");
+        throw failure(exit_code::local_file,
+                      "the " + name + " is longer than " + std::to_string(secret_text::longest) +
+                          " bytes",
+                      one_line);
 }
 
 secret_text prompt(const std::string &label, const std::string &advice, echo shown)
@@ -85,9 +89,9 @@ secret_text read_secret(int number, const std::string &name)
     if (!text.empty() && text.view().back() == '\r')
         text.cut_last();
     if (text.empty())
-        throw failure(exit_code::local_file, "the " + name + " is empty");
+        throw failure(exit_code::local_file, "the " + name + " is empty", one_line);
     if (text.view().find('\n') != std::string_view::npos)
-        throw failure(exit_code::local_file, "the " + name + " has more than one line");
+        throw failure(exit_code::local_file, "the " + name + " has more than one line", one_line);
     return text;
 }
 

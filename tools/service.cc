@@ -21,6 +21,15 @@ void point_library_at(const service_addresses &addresses)
     urls[3] = addresses.secure_upload.c_str();
 }
 
+// The library takes the proxy from the environment alone.
+void use_proxy(const std::optional<proxy_choice> &chosen)
+{
+    if (!chosen)
+        return;
+    ::setenv("https_proxy", chosen->url.c_str(), 1);
+    ::setenv("http_proxy", chosen->url.c_str(), 1);
+}
+
 } // namespace
 
 service::service(const settings &chosen, diagnostic_log &log, const retry_world &world)
@@ -31,6 +40,7 @@ service::service(const settings &chosen, diagnostic_log &log, const retry_world 
     // An emulator listens on this machine alone, where no proxy of the environment finds it.
     if (chosen.emulator)
         ::setenv("no_proxy", "*", 1);
+    use_proxy(chosen.proxy);
     set_quillmere_output_file(log.stream());
     // The pauses between attempts are ours to make, and only some requests may be repeated.
     set_connection_attempts(1);

@@ -7,7 +7,6 @@
 
 #include "console.h"
 #include "failure.h"
-#include "private_file.h"
 
 namespace quillmere::tools {
 
@@ -73,9 +72,10 @@ void session_file::save(const session &current) const
         {"service", current.service}, {"email", current.email}, {"session_token", current.token}};
     // Bytes that are no UTF-8 cannot stand in JSON, and a token with other bytes is another token.
     try {
-        write_private_file(path_, document.dump(2) + "\n", what);
+        write_private_file(path_, document.dump(2) + "\n", what, folder_);
     } catch (const nlohmann::json::exception &) {
-        throw failure(exit_code::unreadable_answer, "the service gave a token that is no text");
+        throw failure(exit_code::unreadable_answer, "the service gave a token that is no text",
+                      "run it again with --verbose to see the answer");
     }
 }
 

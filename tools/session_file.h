@@ -5,6 +5,7 @@
 #include <string>
 
 #include "environment.h"
+#include "private_file.h"
 
 namespace quillmere::tools {
 
@@ -19,7 +20,10 @@ std::string session_path(const environment &surroundings);
 
 class session_file {
 public:
-    explicit session_file(std::string path) : path_(std::move(path)) {}
+    explicit session_file(std::string path, folder_owner folder = folder_owner::program)
+        : path_(std::move(path)), folder_(folder)
+    {
+    }
 
     const std::string &path() const { return path_; }
 
@@ -37,6 +41,7 @@ public:
 
 private:
     std::string path_;
+    folder_owner folder_;
 };
 
 } // namespace quillmere::tools

@@ -15,10 +15,17 @@
 
 namespace quillmere::tools {
 
+/** A proxy and who named it. */
+struct proxy_choice {
+    std::string url;
+    std::string source;
+};
+
 struct settings {
     service_addresses addresses;
     std::optional<emulator_address> emulator; ///< when the service is one
     std::optional<ca_bundle> ca;              ///< nothing only when verification is off
+    std::optional<proxy_choice> proxy;        ///< when it is not the environment's
     int timeout_seconds = 30;
     int retries = 4;
 };
@@ -31,6 +38,11 @@ struct setting_sources {
     std::string default_service;
     std::vector<std::string> system_bundles = system_bundle_paths();
 };
+
+/** Where the session is kept: what the command line names before the environment before the
+ * configuration file, or else session_path(). */
+session_file choose_session_file(const common_arguments &given, const environment &surroundings,
+                                 const profile &chosen_profile);
 
 /** Decides; a failure when sources contradict each other or name something unusable. */
 settings decide_settings(const common_arguments &given, const setting_sources &sources);

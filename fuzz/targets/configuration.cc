@@ -18,8 +18,8 @@ namespace {
 using namespace quillmere::tools;
 
 constexpr const char *path = "/the/configuration";
-constexpr const char *keys[] = {"app_id", "app_key", "app_key_file", "ca_file",
-                                "email",  "retries", "service",      "timeout"};
+constexpr const char *keys[] = {"app_id", "app_key", "app_key_file", "ca_file",      "email",
+                                "proxy",  "retries", "service",      "session_file", "timeout"};
 
 bool shows_no_controls(const std::string &text)
 {
@@ -58,6 +58,14 @@ std::string without_blanks(const std::string &text)
     return text.substr(first, text.find_last_not_of(blanks) - first + 1);
 }
 
+// "profile work" is called "work".
+std::string without_the_word(const std::string &heading)
+{
+    if (heading.substr(0, 8) != "profile " && heading.substr(0, 8) != "profile\t")
+        return heading;
+    return without_blanks(heading.substr(8));
+}
+
 // The last value of the key in the sections of this name, which the file is known to have.
 std::optional<std::string> value_in(const std::string &text, const std::string &section,
                                     const std::string &key)
@@ -71,7 +79,7 @@ std::optional<std::string> value_in(const std::string &text, const std::string &
             continue;
         size_t equals = line.find('=');
         if (line[0] == '[' && line.back() == ']')
-            current = without_blanks(line.substr(1, line.size() - 2));
+            current = without_the_word(without_blanks(line.substr(1, line.size() - 2)));
         else if (current == section && without_blanks(line.substr(0, equals)) == key)
             found = without_blanks(line.substr(equals + 1));
     }
@@ -90,6 +98,7 @@ void check_decision(const settings &decided)
     expect(base.substr(0, 8) == "https://" && base.size() > 8, "the service is asked by https");
     expect(base.back() != '/' && shows_no_controls(base), "an address that paths can follow");
     expect(normal_base_address(base, "again") == base, "a normal address stays as it is");
+    expect(!decided.proxy || shows_no_controls(decided.proxy->url), "a proxy that is an address");
     expect(decided.timeout_seconds >= 1 && decided.retries >= 0, "usable numbers");
 }
 

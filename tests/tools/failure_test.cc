@@ -1,6 +1,8 @@
 // Failures of jobs that take several steps.
 #include "failure.h"
 
+#include <cerrno>
+
 #include <gtest/gtest.h>
 
 namespace quillmere_test {
@@ -38,6 +40,16 @@ TEST(LaterStep, ThatIsTheFirstFailsAsItIs)
 
     EXPECT_EQ(problem.code, exit_code::refused);
     EXPECT_EQ(problem.why, "the name is taken");
+}
+
+TEST(FileFailure, SaysWhatHelpsAgainstIt)
+{
+    EXPECT_EQ(line_of(file_failure("cannot read a", ENOENT)),
+              "quillmere: cannot read a: No such file or directory (check the path)\n");
+    EXPECT_EQ(file_failure("cannot write a", ENOSPC).advice, "make room, then run it again");
+    EXPECT_EQ(file_failure("cannot write a", EACCES).advice, "check who may read and write there");
+    EXPECT_EQ(file_failure("cannot write a", ENOSPC, "buy a disk").advice, "buy a disk");
+    EXPECT_EQ(file_failure("cannot read a", EIO).advice, "");
 }
 
 } // namespace

@@ -10,11 +10,12 @@ program_home::program_home()
 {
     environment = {{"HOME", folder_.path()},
                    {"XDG_STATE_HOME", folder_.path_of("state")},
-                   {"XDG_CONFIG_HOME", folder_.path_of("config")}};
+                   {"XDG_CONFIG_HOME", folder_.path_of("config")},
+                   {"TERM", "dumb"}}; // which shows no colours
     for (const char *variable :
          {"QUILLMERE_SERVICE", "QUILLMERE_EMULATOR", "QUILLMERE_PROFILE", "QUILLMERE_APP_ID",
           "QUILLMERE_APP_KEY", "SSL_CERT_FILE", "http_proxy", "https_proxy", "HTTPS_PROXY",
-          "all_proxy", "ALL_PROXY", "no_proxy", "NO_PROXY"})
+          "all_proxy", "ALL_PROXY", "no_proxy", "NO_PROXY", "NO_COLOR", "QUILLMERE_SESSION_FILE"})
         environment[variable] = std::nullopt;
 }
 

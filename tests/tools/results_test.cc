@@ -16,17 +16,17 @@ const std::vector<fact> facts = {{"a", "Short", "x\x1b[1m"}, {"b", "Much longer"
 
 TEST(Results, AreAlignedForPeople)
 {
-    EXPECT_EQ(facts_as_text(facts, true), "Short        x\\u{1b}[1m\n"
-                                          "Much longer  7\n"
-                                          "Yes          yes\n"
-                                          "No           no\n"
-                                          "Absent       -\n"
-                                          "\xc3\xa4            \xc3\xa4\n");
+    EXPECT_EQ(facts_as_text(facts, text_style::terminal), "Short        x\\u{1b}[1m\n"
+                                                          "Much longer  7\n"
+                                                          "Yes          yes\n"
+                                                          "No           no\n"
+                                                          "Absent       -\n"
+                                                          "\xc3\xa4            \xc3\xa4\n");
 }
 
 TEST(Results, KeepTheirBytesWhereThereIsNoTerminal)
 {
-    EXPECT_EQ(facts_as_text({{"a", "A", "x\x1b[1m"}}, false), "A  x\x1b[1m\n");
+    EXPECT_EQ(facts_as_text({{"a", "A", "x\x1b[1m"}}, text_style::plain), "A  x\x1b[1m\n");
 }
 
 TEST(Results, AreOneObjectForScripts)
@@ -48,7 +48,7 @@ TEST(Results, ForScriptsAloneAreNotShownToPeople)
 {
     const std::vector<fact> hidden = {{"a", nullptr, 1}, {"b", "B", 2}};
 
-    EXPECT_EQ(facts_as_text(hidden, false), "B  2\n");
+    EXPECT_EQ(facts_as_text(hidden, text_style::plain), "B  2\n");
     EXPECT_EQ(nlohmann::json::parse(facts_as_json(hidden)).size(), 2U);
 }
 
@@ -58,7 +58,7 @@ TEST(ResultGroups, LeaveOutWhatIsNotKnown)
         {"one", {{"a", "A", "x"}, {"b", "Nothing", nullptr}, {"c", "Empty", ""}}},
         {"two", {{"a", "Again", 0}, {"d", "No", false}}}};
 
-    EXPECT_EQ(groups_as_text(groups, false), "A      x\nAgain  0\nNo     no\n");
+    EXPECT_EQ(groups_as_text(groups, text_style::plain), "A      x\nAgain  0\nNo     no\n");
 }
 
 TEST(ResultGroups, AreObjectsForScripts)
@@ -77,10 +77,10 @@ const result_table files = {
 
 TEST(ResultTables, HaveHeadingsAndNumbersToTheRight)
 {
-    EXPECT_EQ(table_as_text(files, true), "   Size  Key  Name\n"
-                                          "1000000  -    a\\u{1b}  \n"
-                                          "      5  k    b\n");
-    EXPECT_EQ(table_as_text(files, false).find("a\x1b  \n"), 33U);
+    EXPECT_EQ(table_as_text(files, text_style::terminal), "   Size  Key  Name\n"
+                                                          "1000000  -    a\\u{1b}  \n"
+                                                          "      5  k    b\n");
+    EXPECT_EQ(table_as_text(files, text_style::plain).find("a\x1b  \n"), 33U);
 }
 
 TEST(ResultTables, TakeAColumnWithOneTextToTheLeft)
@@ -88,12 +88,12 @@ TEST(ResultTables, TakeAColumnWithOneTextToTheLeft)
     result_table mixed = {"rows", {{"a", "A"}, {"b", "B"}}, {}};
     mixed.rows = {{{"a", nullptr, 1000}, {"b", nullptr, 1}}, {{"a", nullptr, "x"}}};
 
-    EXPECT_EQ(table_as_text(mixed, false), "A     B\n1000  1\nx     -\n");
+    EXPECT_EQ(table_as_text(mixed, text_style::plain), "A     B\n1000  1\nx     -\n");
 }
 
 TEST(ResultTables, WithoutRowsShowNothing)
 {
-    EXPECT_EQ(table_as_text({"rows", {{"a", "A"}}, {}}, false), "");
+    EXPECT_EQ(table_as_text({"rows", {{"a", "A"}}, {}}, text_style::plain), "");
     EXPECT_EQ(nlohmann::json::parse(table_as_json({}, {"rows", {}, {}})).dump(), R"({"rows":[]})");
 }
 

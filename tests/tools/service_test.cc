@@ -127,7 +127,8 @@ TEST_F(CommandLine, TellsWhatTheServiceRefused)
     const outcome ended = home.run({"login", "someone@example.org", "--password-stdin"}, "wrong");
 
     EXPECT_EQ(ended.exit_status, 3);
-    EXPECT_EQ(ended.err, "quillmere: signing in failed: 107: The credentials are wrong\n");
+    EXPECT_EQ(ended.err, "quillmere: signing in failed: 107: The credentials are wrong (check the "
+                         "e-mail address and the password)\n");
     EXPECT_THAT(ended.out, IsEmpty());
     EXPECT_EQ(server.connections(), 1U);
 }

@@ -222,6 +222,62 @@ TEST_F(Settings, TakeNumbersFromTheNearestSource)
     EXPECT_EQ(decided().retries, 9);
 }
 
+TEST_F(Settings, TakeTheProxyFromTheNearestSource)
+{
+    EXPECT_FALSE(decided().proxy.has_value());
+
+    configured.set("proxy", "http://configured:3128");
+    EXPECT_EQ(decided().proxy->url, "http://configured:3128");
+
+    for (const char *variable : {"https_proxy", "HTTPS_PROXY", "all_proxy", "ALL_PROXY"}) {
+        variables = {{variable, "http://variable"}};
+        EXPECT_FALSE(decided().proxy.has_value()) << variable << ", which the library reads";
+    }
+
+    given.proxy = "flag:80";
+    EXPECT_EQ(decided().proxy->url, "flag:80");
+    EXPECT_EQ(decided().proxy->source, "--proxy");
+}
+
+TEST_F(Settings, RefuseAProxyThatTellsAPasswordOrIsNone)
+{
+    for (const char *proxy : {"http://a:b@host", "a:b@host:1", "http://", "http://a b", "a\nb"}) {
+        given.proxy = proxy;
+        EXPECT_EQ(code_of_failure(), exit_code::usage) << proxy;
+        given.proxy.reset();
+        configured.set("proxy", proxy);
+        EXPECT_EQ(code_of_failure(), exit_code::local_file) << proxy;
+        configured = {};
+    }
+    given.proxy = "http://user@[::1]:3128";
+    EXPECT_EQ(code_of_failure(), exit_code::done);
+}
+
+TEST_F(Settings, TakeTheSessionFileFromTheNearestSource)
+{
+    variables["HOME"] = "/home/a";
+    const auto path = [&] { return choose_session_file(given, surroundings, configured).path(); };
+    EXPECT_EQ(path(), "/home/a/.local/state/quillmere/session.json");
+
+    configured.set("session_file", "~/sessions/work");
+    EXPECT_EQ(path(), "/home/a/sessions/work");
+    configured.set("session_file", "/sessions/work");
+    EXPECT_EQ(path(), "/sessions/work");
+
+    variables["QUILLMERE_SESSION_FILE"] = "variable";
+    EXPECT_EQ(path(), "variable");
+
+    given.session_file = "flag";
+    EXPECT_EQ(path(), "flag");
+}
+
+TEST_F(Settings, RefuseASessionFileThatDependsOnTheWorkingFolder)
+{
+    configured.set("session_file", "work.json");
+
+    EXPECT_THROW(choose_session_file(given, surroundings, configured), failure);
+}
+
 TEST_F(Settings, RefuseNumbersThatAreNone)
 {
     for (const char *text : {"x", "7x", "-1", "0", "99999999999"}) {
@@ -246,27 +302,6 @@ TEST(BaseAddress, IsRefusedWhenItIsNone)
           "x",
           "https://h\xc3\xa4"})
         EXPECT_THROW(normal_base_address(address, "--service"), failure) << address;
-}
-
-TEST(Profile, IsASectionOfTheFile)
-{
-    const std::string text = "# a comment\nservice = https://a\n\n[work]\r\n  service=https://b \n"
-                             "; another\napp_key = x=y#z\n[default]\nretries = 2\n";
-
-    EXPECT_EQ(read_profile(text, std::nullopt, "f").value("service"), "https://a");
-    EXPECT_EQ(read_profile(text, std::nullopt, "f").value("retries"), "2");
-    EXPECT_EQ(read_profile(text, "work", "f").value("service"), "https://b");
-    EXPECT_EQ(read_profile(text, "work", "f").value("app_key"), "x=y#z");
-    EXPECT_EQ(read_profile(text, "work", "f").value("retries"), std::nullopt);
-}
-
-TEST(Profile, IsRefusedWhenUnknownOrUnreadable)
-{
-    EXPECT_THROW(read_profile("[a]\n", "b", "f"), failure);
-    EXPECT_THROW(read_profile("servise = x\n", std::nullopt, "f"), failure);
-    EXPECT_THROW(read_profile("service\n", std::nullopt, "f"), failure);
-    EXPECT_THROW(load_profile("/nonexistent/config", "work"), failure);
-    EXPECT_NO_THROW(load_profile("/nonexistent/config", std::nullopt));
 }
 
 } // namespace

@@ -9,6 +9,7 @@
 #include <nlohmann/json.hpp>
 
 #include "program.h"
+#include "session_file.h"
 #include "support/certificates.h"
 #include "support/scripted_server.h"
 
@@ -30,11 +31,12 @@ TEST_F(Usage, IsExplainedOnRequest)
     const outcome ended = home.run({"--help"});
 
     EXPECT_EQ(ended.exit_status, 0);
-    for (const char *command : {"login",  "logout",  "renew",  "login-token",
-                                "whoami", "status",  "limits", "device-status",
-                                "ls",     "stat",    "mkdir",  "create",
-                                "rm",     "mv",      "cp",     "set",
-                                "links",  "changes", "attach", "detach"})
+    for (const char *command : {"login",  "logout",     "renew",     "login-token",
+                                "whoami", "status",     "limits",    "device-status",
+                                "ls",     "stat",       "mkdir",     "create",
+                                "rm",     "mv",         "cp",        "set",
+                                "links",  "changes",    "attach",    "detach",
+                                "doctor", "quickstart", "completion"})
         EXPECT_THAT(ended.out, HasSubstr(command));
     EXPECT_THAT(ended.err, IsEmpty());
 }
@@ -206,6 +208,44 @@ TEST_F(Usage, OfAProfileReplacesOptions)
     EXPECT_EQ(home.run({"limits"}).exit_status, 0);
     EXPECT_EQ(home.run({"limits", "--profile", "play"}).exit_status, 9);
     EXPECT_EQ(server.connections(), 2U);
+}
+
+TEST_F(Usage, OfASessionFileKeepsSessionsApart)
+{
+    home.configure("[work]\nsession_file = " + home.folder().path_of("elsewhere/work") + "\n");
+    std::filesystem::create_directory(home.folder().path_of("elsewhere"));
+    ASSERT_EQ(::chmod(home.folder().path_of("elsewhere").c_str(), 0755), 0);
+    const quillmere::tools::session_file kept(home.folder().path_of("elsewhere/work"),
+                                              quillmere::tools::folder_owner::somebody);
+    kept.save({"https://work", "", "token"});
+    home.sign_in("https://h", "token");
+
+    EXPECT_EQ(home.run({"logout", "--profile", "work"}).out, "Signed out\n");
+
+    EXPECT_FALSE(std::filesystem::exists(kept.path()));
+    EXPECT_TRUE(std::filesystem::exists(home.session_path()));
+    struct stat facts = {};
+    ASSERT_EQ(::stat(home.folder().path_of("elsewhere").c_str(), &facts), 0);
+    EXPECT_EQ(facts.st_mode & 0777U, 0755U) << "a folder of others stays as it is";
+}
+
+TEST_F(Usage, OfAProxyLeadsThere)
+{
+    const refused_port proxy;
+    home.environment["SSL_CERT_FILE"] = test_root_path();
+    const std::string address = proxy.base_url();
+    home.configure("[work]\nproxy = " + address + "\n");
+
+    for (const std::vector<std::string> &words :
+         {std::vector<std::string>{"--proxy", address}, {"--profile", "work"}}) {
+        std::vector<std::string> arguments = {"limits", "--service", "https://nowhere.invalid",
+                                              "--retries", "0"};
+        arguments.insert(arguments.end(), words.begin(), words.end());
+        const outcome ended = home.run(arguments);
+        EXPECT_EQ(ended.exit_status, 5);
+        EXPECT_THAT(ended.err, HasSubstr(address.substr(address.rfind(':') + 1)))
+            << "the port of the proxy, which refuses";
+    }
 }
 
 TEST_F(Usage, OfALogFileKeepsItPrivate)

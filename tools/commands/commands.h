@@ -27,6 +27,9 @@ void declare_changes(CLI::App &options, arguments &given);
 void declare_attach(CLI::App &options, arguments &given);
 void declare_detach(CLI::App &options, arguments &given);
 
+void declare_completion(CLI::App &options, arguments &given);
+void declare_complete(CLI::App &options, arguments &given);
+
 void run_login(command_context &context);
 void run_logout(command_context &context);
 void run_renew(command_context &context);
@@ -50,6 +53,10 @@ void run_links(command_context &context);
 void run_changes(command_context &context);
 void run_attach(command_context &context);
 void run_detach(command_context &context);
+void run_doctor(command_context &context);
+void run_quickstart(command_context &context);
+void run_completion(command_context &context);
+void run_complete(command_context &context);
 
 /** The session for the chosen service; a failure when nobody is signed in there. */
 session require_session(command_context &context);

@@ -37,10 +37,12 @@ std::vector<fact> facts_of(const remote_entry &entry, const std::string &path, b
 const remote_entry &folder_for_new(const remote_place &place, const std::string &path)
 {
     if (place.exists())
-        throw failure(exit_code::refused, "there is " + path + " already");
+        throw failure(exit_code::refused, "there is " + path + " already",
+                      "choose another name, or remove it first");
     if (place.missing.size() > 1)
         throw failure(exit_code::refused,
-                      "there is no folder " + place.missing.front() + " on the way to " + path);
+                      "there is no folder " + place.missing.front() + " on the way to " + path,
+                      "create it with: quillmere mkdir -p");
     return place.reached;
 }
 
@@ -103,7 +105,8 @@ void run_create(command_context &context)
     const remote_place place = follow_path(tree_of(owner), given.path);
     const remote_entry &folder = folder_for_new(place, given.path);
     if (place.folder_meant)
-        throw failure(exit_code::usage, given.path + " ends in a slash, which no file does");
+        throw failure(exit_code::usage, given.path + " ends in a slash, which no file does",
+                      "leave the slash out, or use mkdir for a folder");
     const remote_entry made = create_file_in(owner, folder, place.missing.front(), given.time);
     context.output.sentence("Created " + given.path, facts_of(made, given.path, true));
 }

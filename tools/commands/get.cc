@@ -41,7 +41,8 @@ local_destination choose_destination(const get_words &words)
     if (is_local_folder(path))
         return {local_folder(path), {}};
     if (words.sources.size() > 1)
-        throw failure(exit_code::local_file, path + " is no folder");
+        throw failure(exit_code::local_file, path + " is no folder",
+                      "several sources need a folder that is there to go to");
     const std::size_t end = path.find_last_not_of('/') + 1;
     const std::size_t slash = path.substr(0, end).rfind('/');
     if (slash == std::string::npos)

@@ -114,7 +114,7 @@ failure download_failure(const remote_entry &file, std::int32_t error, const cha
         why += ": " + std::to_string(error);
     if (message != nullptr)
         why += ": " + std::string(message);
-    failure problem(exit_code::refused, why);
+    failure problem(exit_code::refused, why, "quillmere links tells which links it has");
     if (error != 0)
         problem.status = error;
     return problem;

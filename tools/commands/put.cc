@@ -33,7 +33,8 @@ void check(const put_words &words, bool recursive)
 {
     for (const std::string &source : words.sources) {
         if (source == standard_input && words.sources.size() > 1)
-            throw failure(exit_code::usage, "standard input cannot be uploaded beside others");
+            throw failure(exit_code::usage, "standard input cannot be uploaded beside others",
+                          "upload it by itself");
         if (is_local_folder(source) && !recursive)
             throw failure(exit_code::usage, source + " is a folder",
                           "use --recursive to upload it with all that it holds");
@@ -56,10 +57,13 @@ destination choose_destination(const account &owner, const put_words &words)
         return chosen;
     const bool folder_alone = words.sources.size() == 1 && is_local_folder(words.sources.front());
     if (words.sources.size() > 1 || (folder_alone && chosen.place.exists()))
-        throw failure(exit_code::refused, path + " is no folder");
+        throw failure(exit_code::refused, path + " is no folder",
+                      "name a folder, or create it with: quillmere mkdir -p");
     if (chosen.place.missing.size() > 1 || (chosen.place.folder_meant && !folder_alone))
-        throw failure(exit_code::refused, "there is no folder " + chosen.place.missing.front() +
-                                              " on the way to " + path);
+        throw failure(exit_code::refused,
+                      "there is no folder " + chosen.place.missing.front() + " on the way to " +
+                          path,
+                      "create it with: quillmere mkdir -p");
     return chosen;
 }
 
@@ -126,7 +130,8 @@ private:
             const std::string inner = path_below(source, name);
             report_.attempt([&] {
                 if (is_link(inner))
-                    throw failure(exit_code::local_file, inner + " is a link, which is left out");
+                    throw failure(exit_code::local_file, inner + " is a link, which is left out",
+                                  "name what it leads to as a source of its own");
                 put_entry(inner, into, name);
             });
         }

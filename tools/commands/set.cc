@@ -17,7 +17,8 @@ namespace {
 void refuse_empty(const std::optional<std::string> &text, const char *option)
 {
     if (text && text->empty())
-        throw failure(exit_code::usage, std::string(option) + " must not be empty");
+        throw failure(exit_code::usage, std::string(option) + " must not be empty",
+                      "leave it out to keep what is there");
 }
 
 void check(const set_arguments &given)
@@ -58,7 +59,8 @@ void run_set(command_context &context)
     const account owner = signed_in_account(context);
     const remote_entry entry = find_movable(tree_of(owner), given.path, "changed");
     if (given.recursive && !entry.is_folder())
-        throw failure(exit_code::usage, given.path + " is a file, which --recursive is not for");
+        throw failure(exit_code::usage, given.path + " is a file, which --recursive is not for",
+                      "leave --recursive out");
     update_entry(
         owner, entry,
         {given.name, given.description, given.tags, given.privacy, given.time, given.recursive});

@@ -26,11 +26,13 @@ destination choose_destination(const remote_tree &tree, const remote_entry &sour
     const remote_place place = follow_path(tree, path);
     if (place.exists()) {
         if (!place.reached.is_folder())
-            throw failure(exit_code::refused, "there is " + path + " already");
+            throw failure(exit_code::refused, "there is " + path + " already",
+                          "choose another name, or remove it first");
         return {place.reached, source.name, path_below(path, source.name)};
     }
     if (place.missing.size() > 1 || (place.folder_meant && !source.is_folder()))
-        throw failure(exit_code::refused, "there is no folder " + place.missing.front());
+        throw failure(exit_code::refused, "there is no folder " + place.missing.front(),
+                      "create it with: quillmere mkdir -p");
     return {place.reached, place.missing.front(), path};
 }
 
@@ -77,7 +79,8 @@ void run_mv(command_context &context)
     const destination to = choose_destination(tree, source, given.destination);
     const bool same_folder = to.folder.key == source.parent_key;
     if (same_folder && to.name == source.name)
-        throw failure(exit_code::refused, "there is " + to.path + " already");
+        throw failure(exit_code::refused, "there is " + to.path + " already",
+                      "choose another name or another folder");
     std::string done;
     if (!same_folder) {
         move_into(owner, source, to.folder);

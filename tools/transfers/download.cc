@@ -73,7 +73,8 @@ bool take(running_fetch &under_way, std::string_view piece)
     if (brings_bytes(status_of(under_way.handle))) {
         if (piece.size() > under_way.into.missing())
             throw failure(exit_code::unreadable_answer,
-                          "the link leads to more bytes than the file has");
+                          "the link leads to more bytes than the file has",
+                          "the file may have changed meanwhile: try again");
         under_way.into.append(piece);
         under_way.shown.advance(piece.size());
         return true;

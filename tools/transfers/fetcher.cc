@@ -23,7 +23,8 @@ public:
     {
         check_local_name(name);
         if (!names_.insert(name).second)
-            throw failure(exit_code::refused, "several entries are called " + path);
+            throw failure(exit_code::refused, "several entries are called " + path,
+                          "get each by its key, key:KEY, under a name of its own");
     }
 
 private:
@@ -96,9 +97,11 @@ bool fetcher::is_there(const wanted &each, const local_folder &into)
     check_local_name(each.name);
     const std::string target = into.path_of(each.name);
     if (!each.file.has_content)
-        throw failure(exit_code::refused, each.path + " has no content yet");
+        throw failure(exit_code::refused, each.path + " has no content yet",
+                      "give it some with: quillmere update");
     if (into.entry(each.name) == local_entry::folder)
-        throw failure(exit_code::local_file, "there is a folder " + target + " already");
+        throw failure(exit_code::local_file, "there is a folder " + target + " already",
+                      "give the file another name, or move the folder away");
     if (!into.has(each.name, each.file.content))
         return false;
     report_.add({outcome::unchanged, each.path, target, each.file.key, each.file.content.size});
@@ -143,8 +146,10 @@ void fetcher::get(const wanted &each, const links &known, const local_folder &in
 {
     const auto found = known.find(each.file.key);
     if (found == known.end() || found->second.url.empty())
-        throw failure(exit_code::refused, "there is no download of " + each.path +
-                                              (found == known.end() ? "" : found->second.refusal));
+        throw failure(exit_code::refused,
+                      "there is no download of " + each.path +
+                          (found == known.end() ? "" : found->second.refusal),
+                      "quillmere links tells which links it has");
     partial_file partial(into.number(), each.file.content);
     const bool resumed = partial.size() > 0;
     fetch(each, found->second.url, partial);
@@ -157,7 +162,8 @@ void fetcher::get(const wanted &each, const links &known, const local_folder &in
     if (!right) {
         partial.restart();
         throw failure(exit_code::unreadable_answer,
-                      "the bytes that arrived are not those of " + each.path);
+                      "the bytes that arrived are not those of " + each.path,
+                      "the file may have changed meanwhile: try again");
     }
     partial.rename_to(each.name);
     report_.add({outcome::downloaded, each.path, into.path_of(each.name), each.file.key,

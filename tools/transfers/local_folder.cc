@@ -82,7 +82,8 @@ void check_local_name(const std::string &name)
     if (name.empty() || name == "." || name == ".." || name.find('/') != std::string::npos ||
         name.find('\0') != std::string::npos)
         throw failure(exit_code::local_file,
-                      "the service has a name that no file here can have: \"" + name + "\"");
+                      "the service has a name that no file here can have: \"" + name + "\"",
+                      "give it another name with: quillmere mv, or get it under one");
 }
 
 } // namespace quillmere::tools

@@ -58,7 +58,8 @@ local_source open_source(const std::string &path)
     if (!file || ::fstat(file.number(), &facts) != 0)
         throw file_failure("cannot read " + path, errno);
     if (!S_ISREG(facts.st_mode))
-        throw failure(exit_code::local_file, path + " is neither a file nor a folder");
+        throw failure(exit_code::local_file, path + " is neither a file nor a folder",
+                      "of a pipe, use - and feed it to standard input");
     local_source opened = {path, std::move(file), 0, {}};
     sha256_sum sum;
     read_pieces(opened.file.number(), path, [&](std::string_view piece) {
@@ -101,7 +102,8 @@ std::string name_of_source(const std::string &path)
     const fs::path whole = fs::absolute(path, problem).lexically_normal();
     const fs::path name = whole.has_filename() ? whole.filename() : whole.parent_path().filename();
     if (problem || name.empty())
-        throw failure(exit_code::usage, path + " has no name to be uploaded under");
+        throw failure(exit_code::usage, path + " has no name to be uploaded under",
+                      "give the name as the destination");
     return name;
 }
 

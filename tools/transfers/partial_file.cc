@@ -51,9 +51,10 @@ bool partial_file::open()
     if (!file_ || ::fstat(file_.number(), &opened) != 0)
         throw file_failure("cannot write " + name_, errno);
     if (!S_ISREG(opened.st_mode))
-        throw failure(exit_code::local_file, name_ + " is no file");
+        throw failure(exit_code::local_file, name_ + " is no file", "move it out of the way");
     if (::flock(file_.number(), LOCK_EX | LOCK_NB) != 0)
-        throw failure(exit_code::local_file, "another process is downloading " + name_);
+        throw failure(exit_code::local_file, "another process is downloading " + name_,
+                      "wait until it has ended");
     struct stat named = {};
     return ::fstatat(folder_, name_.c_str(), &named, AT_SYMLINK_NOFOLLOW) == 0 &&
            named.st_dev == opened.st_dev && named.st_ino == opened.st_ino;

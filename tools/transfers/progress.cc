@@ -6,6 +6,7 @@
 
 #include <sys/ioctl.h>
 
+#include "../color.h"
 #include "../console.h"
 #include "../descriptor.h"
 #include "../interrupt.h"
@@ -80,10 +81,13 @@ std::string shortened(const std::string &text, std::size_t most)
     return text.substr(0, end) + "...";
 }
 
-std::string bar_of(double part, std::size_t width)
+std::string bar_of(double part, std::size_t width, bar_color color)
 {
     const auto filled = static_cast<std::size_t>(part * static_cast<double>(width));
-    return "[" + std::string(filled, '=') + std::string(width - filled, ' ') + "]";
+    std::string done(filled, '=');
+    if (color == bar_color::filled)
+        done = painted(done, paint::progress);
+    return "[" + done + std::string(width - filled, ' ') + "]";
 }
 
 } // namespace
@@ -109,7 +113,7 @@ std::string size_text(std::uint64_t bytes)
     return text;
 }
 
-std::string bar_text(const progress_state &state, std::size_t columns_given)
+std::string bar_text(const progress_state &state, std::size_t columns_given, bar_color color)
 {
     const double part = state.total == 0 ? 1
                                          : static_cast<double>(std::min(state.done, state.total)) /
@@ -123,7 +127,7 @@ std::string bar_text(const progress_state &state, std::size_t columns_given)
     const std::size_t taken = columns(before) + behind.size() + 2; // the brackets
     if (taken + smallest_bar > columns_given)
         return shortened(name + "  " + percent + behind, columns_given);
-    return before + bar_of(part, std::min(columns_given - taken, std::size_t{40})) + behind;
+    return before + bar_of(part, std::min(columns_given - taken, std::size_t{40}), color) + behind;
 }
 
 std::string summary_text(const progress_state &state)
@@ -175,7 +179,8 @@ void progress::draw()
     drawn_ = true;
     mark_open_line(true);
     // The last column stays free: a terminal may go to the next line behind it.
-    write_all(STDERR_FILENO, clear_line + bar_text(state_, terminal_columns() - 1));
+    const bar_color color = messages_are_colored() ? bar_color::filled : bar_color::none;
+    write_all(STDERR_FILENO, clear_line + bar_text(state_, terminal_columns() - 1, color));
 }
 
 void progress::clear()

@@ -25,8 +25,11 @@ struct progress_state {
 /** "1.5 MiB"; bytes below 1 KiB as they are. */
 std::string size_text(std::uint64_t bytes);
 
+enum class bar_color { none, filled };
+
 /** The bar, no wider than so many columns: name, part, rate and time left. */
-std::string bar_text(const progress_state &state, std::size_t columns);
+std::string bar_text(const progress_state &state, std::size_t columns,
+                     bar_color color = bar_color::none);
 
 /** What is told when all is there: name, size, time and rate. */
 std::string summary_text(const progress_state &state);

@@ -92,7 +92,8 @@ void transfer_report::require_success() const
     if (files_.empty())
         throw failure(first_failure_->code, failed + ", the first because " + first_failure_->why,
                       first_failure_->advice);
-    throw failure(exit_code::partly_done, sentence() + ", but " + failed);
+    throw failure(exit_code::partly_done, sentence() + ", but " + failed,
+                  "the messages above say why; what is done is not done again");
 }
 
 void transfer_report::tell(results &output) const

@@ -59,7 +59,8 @@ address split(const std::string &url)
         if (each <= ' ' || each == 0x7f)
             // Behind the question mark is the session token.
             throw failure(exit_code::other,
-                          "the upload address is unusable: " + url.substr(0, url.find('?')));
+                          "the upload address is unusable: " + url.substr(0, url.find('?')),
+                          "check the service's address");
     const std::size_t host = url.find("://") + 3;
     const std::size_t path = std::min(url.find('/', host), url.size());
     return {url.substr(host, path - host), url.substr(path)};
@@ -99,7 +100,8 @@ std::size_t read_piece(const upload &asked, std::uint64_t at, std::vector<char> 
         if (got > 0)
             return static_cast<std::size_t>(got);
         if (got == 0)
-            throw failure(exit_code::local_file, "the file became shorter while it was sent");
+            throw failure(exit_code::local_file, "the file became shorter while it was sent",
+                          "send it again when nobody writes to it");
         if (errno != EINTR)
             throw file_failure("cannot read the file", errno);
     }

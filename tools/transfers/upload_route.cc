@@ -48,8 +48,10 @@ upload_route upload_route_of(const settings &chosen)
         throw failure(exit_code::usage, why,
                       "an emulator on this machine is named with --emulator");
     if (!is_on_this_machine(chosen.emulator->plain_base))
-        throw failure(exit_code::usage, why + ", and " + chosen.emulator->plain_base +
-                                            " is not on this machine to go there unencrypted");
+        throw failure(exit_code::usage,
+                      why + ", and " + chosen.emulator->plain_base +
+                          " is not on this machine to go there unencrypted",
+                      "run the command where the emulator runs");
     return upload_route::plain;
 }
 

@@ -24,7 +24,8 @@ std::uint64_t revision_of(const remote_file &file)
     const auto [stop, problem] = std::from_chars(file.revision.data(), end, revision);
     if (problem != std::errc() || stop != end)
         throw failure(exit_code::unreadable_answer,
-                      "the service did not tell the revision of " + file.name);
+                      "the service did not tell the revision of " + file.name,
+                      "run it again with --verbose to see the answer");
     return revision;
 }
 
