@@ -93,6 +93,14 @@ struct changes_arguments {
     bool sample = false;
 };
 
+struct mirror_arguments {
+    std::string remote;
+    std::string local;
+    int interval = 30; ///< in seconds
+    bool follow = false;
+    bool quiet = false;
+};
+
 struct arguments {
     common_arguments common;
     login_arguments login;
@@ -106,6 +114,7 @@ struct arguments {
     set_arguments set;
     links_arguments links;
     changes_arguments changes;
+    mirror_arguments mirror;
 };
 
 } // namespace quillmere::tools

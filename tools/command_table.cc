@@ -28,6 +28,7 @@ constexpr command table[] = {
     {"set", "Change a name, description, tags, privacy or time", declare_set, run_set},
     {"put", "Upload files and folders", declare_put, run_put},
     {"get", "Download files and folders", declare_get, run_get},
+    {"mirror", "Keep a local copy of a folder", declare_mirror, run_mirror},
     {"update", "Upload a new revision of a file", declare_update, run_update},
     {"links", "Show the links of a file", declare_links, run_links},
     {"changes", "Show what changed since a revision", declare_changes, run_changes},
