@@ -31,7 +31,8 @@ protected:
     std::vector<std::string> steps() const
     {
         std::vector<std::string> told;
-        for (const json &each : result_of({"mirror", "/", path(), "--quiet"}).at("steps")) {
+        const json result = result_of({"mirror", "/", path(), "--quiet"});
+        for (const json &each : result.at("steps")) {
             std::string step = each.at("action");
             for (const char *name : {"path", "former_path"})
                 if (!each.at(name).is_null())
@@ -305,9 +306,11 @@ TEST_F(Mirror, ShowsOneOfTwoEntriesOfANameAndSaysSo)
     put_content("/b.txt", "b");
     done({"attach", "key:" + key});
 
-    const json error = error_of({"mirror", "/", path(), "--quiet"}, 8);
+    const outcome ended = home.run({"mirror", "/", path(), "--quiet"});
 
-    EXPECT_THAT(error.at("message"), HasSubstr("1 entry is left out"));
+    EXPECT_EQ(ended.exit_status, 8);
+    EXPECT_THAT(ended.err, HasSubstr("is left out: its name is also that of key:" + key));
+    EXPECT_THAT(ended.err, HasSubstr("1 entry is left out"));
     EXPECT_THAT(paths(), ElementsAre("b.txt", "name", "name/a.txt"));
 }
 
