@@ -4,6 +4,7 @@
 
 #include <gmock/gmock.h>
 
+#include "fake_download.h"
 #include "transfer_account.h"
 
 namespace quillmere_test {
@@ -62,6 +63,16 @@ protected:
         home.folder().write("copy/" + name, bytes);
     }
 };
+
+using HostileService = fake_download;
+
+std::vector<std::string> names_in(const std::string &folder)
+{
+    std::vector<std::string> names;
+    for (const auto &each : fs::directory_iterator(folder))
+        names.push_back(each.path().filename());
+    return names;
+}
 
 } // namespace
 
@@ -381,6 +392,49 @@ TEST_F(Mirror, RefusesAFileAsEitherSide)
     error_of({"mirror", "/a.txt", path()}, 3);
     error_of({"mirror", "/", home.folder().path_of("file")}, 9);
     error_of({"mirror", "/nowhere", path()}, 3);
+}
+
+TEST_F(Mirror, BringsListingsAndFeedsOfSeveralParts)
+{
+    for (int i = 0; i < 130; ++i)
+        fs::create_directories(home.folder().path_of("tree/folder" + std::to_string(i) + "/inner"));
+    mirrored();
+    emulator_command({"put-content", "--account", account_email, "--path", "/tree", "--from",
+                      home.folder().path_of("tree")});
+    done({"cp", "-r", "/tree", "/copied"}); // more than 500 changes with the first
+
+    mirrored();
+
+    EXPECT_EQ(paths().size(), 2 * (1 + 2 * 130u));
+    fs::remove_all(path());
+    mirrored(); // from listings
+    EXPECT_EQ(paths().size(), 2 * (1 + 2 * 130u));
+}
+
+TEST_F(HostileService, LeadsTheMirrorNowhereElse)
+{
+    for (const char *evil : {"../evil", "..", "/evil", "deep/evil", ".quillmere-mirror"}) {
+        name = evil;
+
+        const outcome ended = home.run({"mirror", "key:f", into, "--quiet"});
+
+        EXPECT_EQ(ended.exit_status, 8) << evil << ended.err;
+        EXPECT_THAT(ended.err, HasSubstr("is left out")) << evil;
+        EXPECT_FALSE(fs::exists(home.folder().path_of("evil"))) << evil;
+        EXPECT_THAT(names_in(into), ElementsAre(".quillmere-mirror")) << evil;
+        fs::remove_all(into);
+    }
+}
+
+TEST_F(HostileService, GetsNoOtherBytesIntoTheCopy)
+{
+    bytes_reply = [this](const request &) { return http_reply(200, some_bytes(bytes.size(), 2)); };
+
+    const outcome ended = home.run({"mirror", "key:f", into, "--quiet"});
+
+    EXPECT_EQ(ended.exit_status, 7) << ended.err;
+    EXPECT_THAT(ended.err, HasSubstr("the bytes that arrived are not those of key:f/name"));
+    EXPECT_THAT(names_in(into), ElementsAre(".quillmere-mirror"));
 }
 
 TEST_F(Mirror, FollowsUntilItIsInterrupted)

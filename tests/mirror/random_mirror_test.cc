@@ -263,7 +263,7 @@ TEST_F(RandomMirror, EndsAsTheAccountIsWhateverStoppedIt)
 TEST_F(RandomMirror, LosesNothingThatTheUserWrote)
 {
     change_accounts(40);
-    run_unhindered(true);
+    run_unhindered(shown_tree(listed_account(sessions[ann])).all_shown);
     for (std::uint32_t round = 0; round < number_in("QUILLMERE_ROUNDS", 4); ++round) {
         for (int part = 0; part < 2; ++part) {
             change_accounts(8);
