@@ -226,6 +226,28 @@ TEST_F(Mirror, KeepsALocalChangeOfWhatIsRemovedOrMoved)
     EXPECT_EQ(content_of(path("c.txt")), "b");
 }
 
+TEST_F(Mirror, KeepsALocalChangeAlsoAfterARunThatCouldDoNothing)
+{
+    put_content("/a.txt", "a");
+    put_content("/b.txt", "b");
+    mirrored();
+    write_here("a.txt", "mine");
+    write_here("b.txt", "mine, too");
+    command away = home.with({"mirror", "/", path(), "--retries", "0"});
+    away.program = QUILLMERE_KILLED_PROGRAM;
+    // Behind the first state that it keeps, before it knows what became of the account.
+    away.environment["QUILLMERE_TEST_KILL_AT"] = "9";
+    ASSERT_EQ(run(away).signal, SIGKILL);
+    done({"rm", "/a.txt"});
+    put_content("/b.txt", "b2");
+
+    mirrored();
+
+    EXPECT_EQ(content_of(path("a.txt")), "mine");
+    EXPECT_EQ(content_of(path("b.txt.local-1")), "mine, too");
+    EXPECT_EQ(content_of(path("b.txt")), "b2");
+}
+
 TEST_F(Mirror, LeavesLocalFilesAloneAndTakesTheirPlaceForItsOwn)
 {
     put_content("/same.txt", "same");

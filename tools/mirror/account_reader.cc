@@ -15,7 +15,7 @@ constexpr std::int32_t parameter_invalid = 106;
 
 constexpr int rounds_of_news = 4;
 constexpr int listings_of_a_folder = 5;
-constexpr unsigned steps_between_keeping = 200;
+constexpr std::size_t steps_between_keeping = 200;
 
 std::string text_of(const char *text) { return text == nullptr ? "" : text; }
 
@@ -71,7 +71,7 @@ bool account_reader::update(known_account &known)
     for (int round = 0; round < rounds_of_news; ++round) {
         const bool more = take_in_news(known);
         any = any || more;
-        if (!more && known.unfinished().empty())
+        if (!more && (round > 0 || known.unfinished().empty()))
             break;
         fill(known);
     }
@@ -143,7 +143,7 @@ void account_reader::fill(known_account &known)
                 continue;
             more = true;
             finish(known, key);
-            count_step();
+            keep_now_and_then(known);
         }
     }
 }
@@ -160,7 +160,9 @@ void account_reader::finish(known_account &known, const std::string &key)
     } catch (const failure &problem) {
         if (problem.code != exit_code::refused)
             throw;
-        refusals_.emplace(key, problem);
+        failure named = problem;
+        named.why = "key:" + key + ": " + problem.why;
+        refusals_.emplace(key, named);
     }
 }
 
@@ -223,10 +225,13 @@ std::string account_reader::epoch()
     return text_of(epoch);
 }
 
-void account_reader::count_step()
+// The more is known, the longer it takes to write it down.
+void account_reader::keep_now_and_then(const known_account &known)
 {
-    if (++steps_ % steps_between_keeping == 0)
-        keep_();
+    if (++steps_ < steps_between_keeping + known.entries.size() / 10)
+        return;
+    steps_ = 0;
+    keep_();
 }
 
 } // namespace quillmere::tools

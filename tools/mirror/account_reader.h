@@ -2,8 +2,8 @@
 #pragma once
 
 #include <functional>
+#include <map>
 #include <optional>
-#include <set>
 #include <string>
 
 #include "../account.h"
@@ -53,13 +53,13 @@ private:
     folder_content steady_content(const remote_entry &folder);
     std::uint64_t device_revision();
     std::string epoch();
-    void count_step();
+    void keep_now_and_then(const known_account &known);
 
     const account &owner_;
     std::function<void()> keep_;
     std::map<std::string, failure> refusals_;
     std::uint64_t seen_revision_ = 0;
-    unsigned steps_ = 0;
+    std::size_t steps_ = 0; ///< since it was last kept
 };
 
 } // namespace quillmere::tools

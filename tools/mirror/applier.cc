@@ -158,6 +158,7 @@ void applier::bring_all(const std::vector<std::string> &keys)
 {
     find_reusable();
     constexpr std::size_t at_once = linked_content::links_at_once;
+    std::size_t brought = 0;
     for (std::size_t begin = 0; begin < keys.size(); begin += at_once) {
         std::vector<std::string> remote;
         for (std::size_t i = begin; i < std::min(begin + at_once, keys.size()); ++i)
@@ -166,6 +167,10 @@ void applier::bring_all(const std::vector<std::string> &keys)
                     remote.push_back(keys[i]);
             });
         fetch_all(remote);
+        brought += at_once;
+        if (brought < here_.size() / 10)
+            continue; // the more there is, the longer it takes to write it down
+        brought = 0;
         keep_();
     }
 }

@@ -158,11 +158,12 @@ private:
     {
         const wanted_entry *const wanted = wanted_.find(key);
         const place recorded = {placed.parent, placed.name};
+        placed.changed_here = false;
         if (const auto stamp = stamp_of_file(copy_.own(), local_copy::aside_name(key))) {
             placed.set_aside = true;
-            placed.changed_here = !(*stamp == placed.stamp) &&
-                                  !copy_.own().has(local_copy::aside_name(key), placed.content);
-            placed.stamp = *stamp;
+            const bool same = *stamp == placed.stamp ||
+                              copy_.own().has(local_copy::aside_name(key), placed.content);
+            judge(placed, same, *stamp);
             return true;
         }
         const bool was_aside = std::exchange(placed.set_aside, false);
@@ -202,9 +203,17 @@ private:
         const std::string *const other = wanted_.key_at(recorded.first, recorded.second);
         if (other != nullptr && *other != key && has(recorded, wanted_.entries.at(*other).content))
             return false;
-        placed.changed_here = !has(recorded, placed.content);
-        placed.stamp = *stamp;
+        judge(placed, has(recorded, placed.content), *stamp);
         return claim(placed);
+    }
+
+    // What was changed here keeps the stamp of what was written: with its own it would pass for
+    // that in the next run.
+    static void judge(placement &placed, bool same, const file_stamp &stamp)
+    {
+        placed.changed_here = !same;
+        if (same)
+            placed.stamp = stamp;
     }
 
     bool is_free(const place &where) const { return claimed_.count(where) == 0; }
