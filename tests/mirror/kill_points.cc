@@ -17,11 +17,12 @@ long chosen_point()
     return text == nullptr ? 0 : std::atol(text);
 }
 
+const long chosen = chosen_point();
+long passed_points = 0;
+
 void pass_point()
 {
-    static const long chosen = chosen_point();
-    static long passed = 0;
-    if (++passed == chosen)
+    if (++passed_points == chosen)
         ::raise(SIGKILL);
 }
 
@@ -50,11 +51,12 @@ int __wrap_unlinkat(int folder, const char *name, int flags);
 int __wrap_renameat(int from, const char *name, int to, const char *new_name);
 int __wrap_renameat2(int from, const char *name, int to, const char *new_name, unsigned flags);
 
-// Half of the bytes may have gone.
+// Of the bytes of the last call half have gone.
 ssize_t __wrap_write(int file, const void *bytes, size_t count)
 {
     pass_point();
-    return passed(__real_write(file, bytes, count > 1 ? count / 2 : count));
+    const bool is_last = passed_points + 1 == chosen;
+    return passed(__real_write(file, bytes, is_last ? count / 2 : count));
 }
 
 int __wrap_fsync(int file)

@@ -235,8 +235,8 @@ TEST_F(Mirror, KeepsALocalChangeAlsoAfterARunThatCouldDoNothing)
     write_here("b.txt", "mine, too");
     command away = home.with({"mirror", "/", path(), "--retries", "0"});
     away.program = QUILLMERE_KILLED_PROGRAM;
-    // Behind the first state that it keeps, before it knows what became of the account.
-    away.environment["QUILLMERE_TEST_KILL_AT"] = "9";
+    // When it has kept its first state, and does not know yet what became of the account.
+    away.environment["QUILLMERE_TEST_KILL_AT"] = "11";
     ASSERT_EQ(run(away).signal, SIGKILL);
     done({"rm", "/a.txt"});
     put_content("/b.txt", "b2");

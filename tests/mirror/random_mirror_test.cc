@@ -121,7 +121,7 @@ protected:
         switch (below(5)) {
         case 0:
         case 1:
-            return note_end(run_killed_at(1 + scaled(256)));
+            return note_end(run_killed_at(1 + scaled(160)));
         case 2:
             relay->cut_after(way::to_client, scaled(60'000));
             note_end(run(mirror_command(QUILLMERE_PROGRAM)));
