@@ -106,6 +106,14 @@ struct complete_arguments {
     std::string prefix; ///< the word so far
 };
 
+struct mirror_arguments {
+    std::string remote;
+    std::string local;
+    int interval = 30; ///< in seconds
+    bool follow = false;
+    bool quiet = false;
+};
+
 struct arguments {
     common_arguments common;
     login_arguments login;
@@ -121,6 +129,7 @@ struct arguments {
     changes_arguments changes;
     completion_arguments completion;
     complete_arguments complete;
+    mirror_arguments mirror;
 };
 
 } // namespace quillmere::tools

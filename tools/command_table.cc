@@ -31,6 +31,7 @@ constexpr command table[] = {
     {"set", "Change a name, description, tags, privacy or time", declare_set, run_set, remote},
     {"put", "Upload files and folders", declare_put, run_put, local_and_remote},
     {"get", "Download files and folders", declare_get, run_get, local_and_remote},
+    {"mirror", "Keep a local copy of a folder", declare_mirror, run_mirror, local_and_remote},
     {"update", "Upload a new revision of a file", declare_update, run_update, local_and_remote},
     {"links", "Show the links of a file", declare_links, run_links, remote},
     {"changes", "Show what changed since a revision", declare_changes, run_changes},

@@ -1,7 +1,6 @@
 #include "remote_path.h"
 
 #include <algorithm>
-#include <string_view>
 
 #include "failure.h"
 #include "text.h"
@@ -17,19 +16,6 @@ struct parsed_path {
     std::vector<std::string> names;
     bool folder_meant = false;
 };
-
-// The library sends keys as they are, so that another character could add a parameter of its own.
-bool is_key(std::string_view text)
-{
-    constexpr std::string_view marks = "-._~";
-    for (const char each : text) {
-        const bool letter = (each >= 'a' && each <= 'z') || (each >= 'A' && each <= 'Z');
-        const bool digit = each >= '0' && each <= '9';
-        if (!letter && !digit && marks.find(each) == std::string_view::npos)
-            return false;
-    }
-    return !text.empty();
-}
 
 std::string checked_key(std::string_view key, const std::string &path)
 {
@@ -111,6 +97,18 @@ void require_folder(const remote_entry &entry)
 }
 
 } // namespace
+
+bool is_key(std::string_view text)
+{
+    constexpr std::string_view marks = "-._~";
+    for (const char each : text) {
+        const bool letter = (each >= 'a' && each <= 'z') || (each >= 'A' && each <= 'Z');
+        const bool digit = each >= '0' && each <= '9';
+        if (!letter && !digit && marks.find(each) == std::string_view::npos)
+            return false;
+    }
+    return !text.empty();
+}
 
 const char *word_for(entry_kind kind) { return kind == entry_kind::folder ? "folder" : "file"; }
 

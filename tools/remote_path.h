@@ -5,6 +5,7 @@
 #include <functional>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace quillmere::tools {
@@ -64,6 +65,10 @@ remote_entry find_file(const remote_tree &tree, const std::string &path);
 
 /** The failure of a path that leads nowhere. */
 [[noreturn]] void throw_missing(const std::string &path);
+
+/** Whether a text can be a key: the library sends keys as they are, so that another character could
+ * add a parameter of its own. */
+bool is_key(std::string_view text);
 
 /** The key in a path that is "key:" and a key, and nothing else. */
 std::optional<std::string> key_in(const std::string &path);

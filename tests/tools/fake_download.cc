@@ -40,6 +40,10 @@ std::string fake_download::reply_to(const request &asked) const
         return success(asked.parameter("content_type") == "files"
                            ? "<files><file>" + file_facts() + "</file></files>"
                            : "");
+    if (path == "/api/device/get_status.php" || path == "/api/device/get_changes.php")
+        return success("<device_revision>1</device_revision>");
+    if (path == "/api/user/myfiles_revision.php")
+        return success("<revision>1</revision><epoch>1</epoch>");
     if (path == "/api/file/get_links.php")
         return success("<links><link><quickkey>k</quickkey><direct_download>" + link +
                        "</direct_download></link></links>");

@@ -5,6 +5,7 @@
 #include <CLI/CLI.hpp>
 
 #include "../account.h"
+#include "../change_feed.h"
 #include "../record_fields.h"
 
 namespace quillmere::tools {
@@ -22,13 +23,6 @@ struct feed {
                              {"parent_key", "In folder"},
                              {"name", "Name"}},
                             {}};
-};
-
-/** What an operation of the feed hands out. */
-struct block {
-    std::uint64_t revision = 0;
-    change_list_owner changes;
-    std::int32_t size = 0;
 };
 
 constexpr record_field<change_info> text_fields[] = {
@@ -53,30 +47,7 @@ std::vector<fact> facts_of(const change_info *record)
     return facts;
 }
 
-std::int32_t ask_for_block(const char *session, std::uint64_t since, std::uint32_t device,
-                           decltype(get_device_changes) *ask, block &read, char **error_message)
-{
-    change_list *changes = nullptr;
-    std::uint32_t count = 0;
-    const std::int32_t status =
-        ask(session, since, device, &read.revision, &changes, &count, &read.size, error_message);
-    // After a malformed reply the list is gone already, though the pointer still leads there.
-    if (status != QM_MALFORMED_REPLY)
-        read.changes.reset(changes);
-    return status;
-}
-
-block read_block(const account &owner, std::uint64_t since, std::uint32_t device)
-{
-    block read;
-    owner.remote.read("reading the changes", [&](char **error_message) {
-        return ask_for_block(owner.session(), since, device, get_device_changes, read,
-                             error_message);
-    });
-    return read;
-}
-
-void add_block(const block &read, feed &whole)
+void add_block(const change_block &read, feed &whole)
 {
     for (const change_info *each : in_order_sent(read.changes.get()))
         whole.changes.rows.push_back(facts_of(each));
@@ -89,7 +60,7 @@ feed read_feed(const account &owner, std::uint64_t since, std::uint32_t device)
     feed whole;
     whole.revision = since;
     for (;;) {
-        const block next = read_block(owner, whole.revision, device);
+        const change_block next = read_changes(owner, whole.revision, device);
         add_block(next, whole);
         if (next.revision <= whole.revision)
             return whole;
@@ -99,9 +70,9 @@ feed read_feed(const account &owner, std::uint64_t since, std::uint32_t device)
 
 feed read_sample()
 {
-    block sample;
+    change_block sample;
     char *message = nullptr;
-    ask_for_block("", 0, 0, test_get_device_changes, sample, &message);
+    ask_for_changes("", 0, 0, test_get_device_changes, sample, &message);
     const heap_text owned(message);
     feed whole;
     add_block(sample, whole);

@@ -1,12 +1,11 @@
 // Downloads of an account: files, and folders with all that they hold.
 #pragma once
 
-#include <map>
 #include <string>
 #include <vector>
 
 #include "../command.h"
-#include "download.h"
+#include "linked_content.h"
 #include "local_folder.h"
 #include "remote_file.h"
 #include "report.h"
@@ -32,22 +31,13 @@ private:
         std::string path; ///< in the account
         std::string name; ///< in the local folder
     };
-    struct link {
-        std::string url;
-        std::string refusal; ///< why there is none
-    };
-    using links = std::map<std::string, link>; // by quick key
-
     bool is_there(const wanted &each, const local_folder &into);
     void get_all(const std::vector<wanted> &files, const local_folder &into);
-    links links_of(const std::vector<wanted> &files);
-    void get(const wanted &each, const links &known, const local_folder &into);
-    void fetch(const wanted &each, const std::string &url, partial_file &into);
+    void get(const wanted &each, const local_folder &into);
 
     const account &owner_;
     transfer_report &report_;
-    progress_style style_;
-    downloader downloader_;
+    linked_content contents_;
 };
 
 } // namespace quillmere::tools

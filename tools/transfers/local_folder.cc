@@ -32,6 +32,8 @@ local_folder::local_folder(const std::string &path)
 {
 }
 
+local_folder local_folder::again() const { return {path_, opened_folder(number(), ".", 0, path_)}; }
+
 local_folder local_folder::enter(const std::string &name) const
 {
     check_local_name(name);
@@ -39,6 +41,17 @@ local_folder local_folder::enter(const std::string &name) const
     if (::mkdirat(number(), name.c_str(), 0777) != 0 && errno != EEXIST)
         throw file_failure("cannot make the folder " + path, errno);
     return {path, opened_folder(number(), name, O_NOFOLLOW, path)};
+}
+
+std::optional<local_folder> local_folder::find(const std::string &name) const
+{
+    check_local_name(name);
+    descriptor opened(::openat(number(), name.c_str(), folder_flags | O_NOFOLLOW));
+    if (!opened && errno != ENOENT && errno != ENOTDIR && errno != ELOOP)
+        throw file_failure("cannot use the folder " + path_of(name), errno);
+    if (!opened)
+        return std::nullopt;
+    return local_folder(path_of(name), std::move(opened));
 }
 
 local_entry local_folder::entry(const std::string &name) const

@@ -2,6 +2,7 @@
 // none of them leads out of it.
 #pragma once
 
+#include <optional>
 #include <string>
 
 #include "../descriptor.h"
@@ -17,8 +18,13 @@ public:
     /** Opens a folder that the user named; its path may lead through symbolic links. */
     explicit local_folder(const std::string &path);
 
+    /** The same folder once more. */
+    local_folder again() const;
+
     /** Opens a folder inside, which is made if it is missing. A link in its place is refused. */
     local_folder enter(const std::string &name) const;
+    /** Opens a folder inside that is there; nothing when there is none, or a link in its place. */
+    std::optional<local_folder> find(const std::string &name) const;
 
     local_entry entry(const std::string &name) const;
     /** Whether the file of this name has these bytes. */

@@ -97,6 +97,12 @@ bool partial_file::is_right()
     return size_ == expected_.size && hex_of(sum_.finish()) == expected_.sha256;
 }
 
+void partial_file::flush()
+{
+    if (::fsync(file_.number()) != 0)
+        throw file_failure("cannot write " + name_, errno);
+}
+
 void partial_file::rename_to(const std::string &name)
 {
     if (::renameat(folder_, name_.c_str(), folder_, name.c_str()) != 0)

@@ -43,6 +43,11 @@ public:
     bool is_right();
     /** Gives it its name, in the place of a file that has it. */
     void rename_to(const std::string &name);
+    /** Sees to it that a power cut does not take the bytes back. */
+    void flush();
+    const std::string &name() const { return name_; }
+    /** Told when somebody else has given it its name: there is nothing to remove then. */
+    void left() { in_place_ = true; }
 
     /** The name under which the beginning of these bytes is kept. */
     static std::string name_for(const expected_content &expected);
