@@ -144,6 +144,8 @@ def check_tree(checker):
     checker.check("update", home.write("one.txt", "three\n"), "/a/one.txt")
     checker.check("get", "/a/one.txt", home.path("back.txt"))
     checker.check("get", "/a/one.txt", home.path("back.txt"))
+    checker.check("mirror", "/a", home.path("copy"))
+    checker.check("mirror", "/a", home.path("copy"))
     checker.check("ls", "/a")
     checker.check("ls", "-l", "/a")
     for path in ("/", "/a", "/a/one.txt", "/a/empty"):

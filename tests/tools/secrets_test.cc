@@ -79,11 +79,16 @@ const tried_command tried_commands[] = {
     {"set", "/api/folder/update.php", {"key:f", "--tags", "a"}},
     {"put", upload, {"source", "/"}},
     {"get", "/bytes", {"key:k", "into"}},
+    {"mirror", "/api/1.0/folder/get_content.php", {"/", "copy"}},
     {"update", upload, {"source", "key:k"}},
     {"links", "/api/file/get_links.php", {"key:k"}},
     {"changes", "/api/device/get_changes.php", {}},
     {"attach", "/api/folder/attach_foreign.php", {"key:f"}},
     {"detach", "/api/folder/detach_foreign.php", {"key:f"}},
+    {"doctor", "/api/system/get_status.php", {}},
+    {"quickstart", "", {}},
+    {"completion", "", {"bash"}},
+    {"__complete", "", {"profile", ""}},
 };
 
 /** In every reply, whatever was asked for. */
