@@ -6,6 +6,7 @@
 #include <curl/curl.h>
 
 #include "runtime/dns_share.h"
+#include "runtime/kept_certificates.h"
 #include "runtime/memory.h"
 
 namespace quillmere {
@@ -36,6 +37,7 @@ void api_global_init(const char *ca_path)
 
 void api_global_cleanup(void)
 {
+    forget_certificates();
     curl_global_cleanup();
     std::free(std::exchange(ca_cert_pem_path.path, nullptr));
     cleanup_proxy();

@@ -52,7 +52,8 @@ void send_body(CURL *handle, const http_request &request)
 }
 
 // Sets everything up for one attempt; false if libcurl refuses what the attempt cannot do without.
-bool prepare(CURL *handle, const http_request &request, error_text &error, response_body &body)
+bool prepare(CURL *handle, const http_request &request, X509_STORE *certificates, error_text &error,
+             response_body &body)
 {
     share_dns_cache(handle);
     curl_easy_setopt(handle, CURLOPT_ERRORBUFFER, error.text);
@@ -62,7 +63,7 @@ bool prepare(CURL *handle, const http_request &request, error_text &error, respo
     keep_no_tls_sessions(handle);
     limit_time(handle, request);
     curl_easy_setopt(handle, CURLOPT_NOPROGRESS, 1L);
-    if (!use_proxy(handle) || !verify_peer(handle))
+    if (!use_proxy(handle) || !verify_peer(handle, certificates))
         return false;
     body.receive_with(handle);
     if (ssl_disabled) {
@@ -86,9 +87,10 @@ void report_failure(CURLcode code, const error_text &error)
 // One attempt: the response code, with the body in received, or -1.
 int64_t attempt(const http_request &request, error_text &error, string_buffer *received)
 {
-    easy_handle handle(curl_easy_init());
+    certificate_store certificates = trusted_certificates(request.url);
     response_body body(received);
-    if (!handle || !prepare(handle.get(), request, error, body))
+    easy_handle handle(curl_easy_init());
+    if (!handle || !prepare(handle.get(), request, certificates.get(), error, body))
         return -1;
     CURLcode code = curl_easy_perform(handle.get());
     if (code != CURLE_OK) {

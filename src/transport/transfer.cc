@@ -3,6 +3,8 @@
 #include <strings.h>
 
 #include "runtime/dns_share.h"
+#include "runtime/kept_certificates.h"
+#include "transport/certificate_hook.h"
 
 namespace quillmere {
 
@@ -66,12 +68,25 @@ bool use_proxy(CURL *handle)
     return kept;
 }
 
-bool verify_peer(CURL *handle)
+bool verify_peer(CURL *handle, X509_STORE *certificates)
 {
-    if (ca_cert_pem_path.path)
-        return keep(handle, CURLOPT_CAINFO, ca_cert_pem_path.path);
-    curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 0L);
+    if (!ca_cert_pem_path.path) {
+        curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 0L);
+        return true;
+    }
+    // Set in any case, so that whatever goes wrong without it ends as libcurl says.
+    if (!keep(handle, CURLOPT_CAINFO, ca_cert_pem_path.path))
+        return false;
+    if (certificates)
+        verify_against(handle, certificates);
     return true;
+}
+
+certificate_store trusted_certificates(const char *url)
+{
+    bool used = ca_cert_pem_path.path && url && strncasecmp(url, "https:", 6) == 0;
+    return used && takes_certificates_from_memory() ? certificates_of(ca_cert_pem_path.path)
+                                                    : nullptr;
 }
 
 void log_failure(CURLcode code, const error_text &error)

@@ -10,13 +10,16 @@
 
 namespace quillmere_test {
 
-// Numbers stand in number; texts, copied, in text; other pointers in pointer.
+// Numbers stand in number; texts and blobs, copied, in text; other pointers in pointer.
 struct easy_option {
     CURLoption option;
     long number;
     std::string text;
     const void *pointer;
 };
+
+// What hands over certificates in memory, in its order.
+extern const std::vector<CURLoption> memory_options;
 
 // While it lives, calls to libcurl go by its fields. One at a time, on one thread.
 class easy_calls {
