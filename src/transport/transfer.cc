@@ -4,6 +4,7 @@
 
 #include "runtime/dns_share.h"
 #include "runtime/kept_certificates.h"
+#include "runtime/kept_handles.h"
 #include "transport/certificate_hook.h"
 
 namespace quillmere {
@@ -77,16 +78,18 @@ bool verify_peer(CURL *handle, X509_STORE *certificates)
     // Set in any case, so that whatever goes wrong without it ends as libcurl says.
     if (!keep(handle, CURLOPT_CAINFO, ca_cert_pem_path.path))
         return false;
-    if (certificates)
+    if (certificates && takes_certificates_from_memory())
         verify_against(handle, certificates);
     return true;
 }
 
 certificate_store trusted_certificates(const char *url)
 {
-    bool used = ca_cert_pem_path.path && url && strncasecmp(url, "https:", 6) == 0;
-    return used && takes_certificates_from_memory() ? certificates_of(ca_cert_pem_path.path)
-                                                    : nullptr;
+    if (!ca_cert_pem_path.path)
+        return nullptr;
+    bool verifies = url && strncasecmp(url, "https:", 6) == 0;
+    bool used = (verifies && takes_certificates_from_memory()) || keeps_connections();
+    return used ? certificates_of(ca_cert_pem_path.path) : nullptr;
 }
 
 void log_failure(CURLcode code, const error_text &error)

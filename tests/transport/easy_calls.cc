@@ -142,6 +142,10 @@ CURLcode watched_getinfo(CURL *handle, int number, ...)
     auto info = static_cast<CURLINFO>(number);
     if (current && current->refused_info == info)
         return CURLE_UNKNOWN_OPTION;
+    if (current && current->told.count(info) > 0) {
+        *static_cast<long *>(answer) = current->told[info];
+        return CURLE_OK;
+    }
     return real_getinfo(handle, info, answer);
 }
 

@@ -261,6 +261,88 @@ TEST_F(KeptCertificates, ServeManyThreadsAtOnce)
     EXPECT_EQ(files.openings_of(file), 1u);
 }
 
+class ConnectionsUnderCertificates : public KeptCertificates {
+protected:
+    ConnectionsUnderCertificates()
+    {
+        set_connection_reuse(1);
+        server.script([](connection &client) {
+            for (;;) {
+                client.read_request();
+                client.send("HTTP/1.1 200 OK\r\nContent-Length: 4\r\n\r\nkept");
+            }
+        });
+    }
+};
+
+TEST_F(ConnectionsUnderCertificates, AreKeptAsLongAsTheFileStays)
+{
+    for (int request = 0; request < 3; ++request)
+        EXPECT_EQ(code(), 200);
+
+    EXPECT_EQ(server.connections(), 1u);
+    EXPECT_EQ(files.openings_of(file), 1u);
+}
+
+TEST_F(ConnectionsUnderCertificates, AreKeptAlsoWhenLibcurlReadsTheFile)
+{
+    shares_openssl_with_libcurl = false;
+
+    for (int request = 0; request < 3; ++request)
+        EXPECT_EQ(code(), 200);
+
+    EXPECT_EQ(server.connections(), 1u);
+}
+
+TEST_F(ConnectionsUnderCertificates, AreNotUsedOnceTheFileHoldsOthers)
+{
+    ASSERT_EQ(code(), 200);
+
+    folder.write("roots.pem", pem_of(stranger));
+
+    EXPECT_EQ(code(), -1);
+    EXPECT_THAT(log.text(), MatchesRegex(failure_line(CURLE_PEER_FAILED_VERIFICATION)));
+}
+
+TEST_F(ConnectionsUnderCertificates, AreNotUsedOnceTheFileIsGone)
+{
+    ASSERT_EQ(code(), 200);
+
+    ASSERT_EQ(::unlink(file.c_str()), 0);
+
+    EXPECT_EQ(code(), -1);
+    EXPECT_THAT(log.text(), MatchesRegex(failure_line(CURLE_SSL_CACERT_BADFILE)));
+}
+
+TEST_F(ConnectionsUnderCertificates, AreNotUsedUnderAnotherPath)
+{
+    ASSERT_EQ(code(), 200);
+
+    replace_owned_text(ca_cert_pem_path.path, folder.write("other.pem", pem_of(stranger)));
+
+    EXPECT_EQ(code(), -1);
+}
+
+TEST_F(ConnectionsUnderCertificates, OfTheTimeWithoutVerificationAreNotUsed)
+{
+    replace_owned_text(ca_cert_pem_path.path, std::nullopt);
+    ASSERT_EQ(code(), 200);
+
+    replace_owned_text(ca_cert_pem_path.path, folder.path_of("missing.pem"));
+
+    EXPECT_EQ(code(), -1);
+}
+
+TEST_F(ConnectionsUnderCertificates, AreMadeAnewUntilTheFileHasSettled)
+{
+    pretended_time too_early(changed(file) + 2);
+
+    EXPECT_EQ(code(), 200);
+    EXPECT_EQ(code(), 200);
+
+    EXPECT_EQ(server.connections(), 2u);
+}
+
 // One exchange with a server whose certificate, or one of whose roots, is as a test wants it, with
 // the certificates in memory and without.
 struct trial {
