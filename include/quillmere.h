@@ -1761,6 +1761,32 @@ QM_API const char *quillmere_version(void);
  */
 QM_API int32_t set_response_limit(int64_t bytes);
 
+/**
+ * Has the requests of the operations, of get_response_from_url() and of make_api_call() keep their
+ * connections for later requests, which then need no handshake. Off initially: each request has a
+ * connection of its own. The probes and the connections of send_file_new() are not concerned.
+ *
+ * What it costs:
+ *   - Up to 16 sets of idle connections stay open, as many as there were requests at the same time,
+ *     until a later request finds them too old, they are switched off, or the library stops. No
+ *     thread looks after them meanwhile.
+ *   - A connection that the server has closed is replaced, which neither counts as an attempt nor
+ *     is logged. If it ended while a request was on it, before any answer, the request is sent once
+ *     more, even with a single attempt: the service may see it twice.
+ *   - A connection that vanished without a word, such as in a gateway, is only noticed by the
+ *     time-out, which counts as an attempt. The next attempt has a new connection.
+ *   - A server is verified when a connection is made, and not again on every request.
+ *
+ * All are closed when the certificate file (its path or its content), the proxy settings or
+ * ssl_disabled have changed. After a fork() the child makes connections of its own and leaves the
+ * parent's alone. Without being able to read the certificate file, nothing is kept.
+ *
+ * @param enabled non-zero to keep connections; 0 to close those that are kept, too
+ *
+ * Configuration; it outlasts api_global_cleanup(), which closes what is kept.
+ */
+QM_API void set_connection_reuse(int32_t enabled);
+
 #ifdef __cplusplus
 }
 #endif

@@ -6,6 +6,8 @@
 #include <curl/curl.h>
 
 #include "runtime/dns_share.h"
+#include "runtime/kept_certificates.h"
+#include "runtime/kept_handles.h"
 #include "runtime/memory.h"
 
 namespace quillmere {
@@ -27,6 +29,7 @@ void api_global_init(const char *ca_path)
 {
     curl_global_init(CURL_GLOBAL_ALL);
     tls_init();
+    drop_kept_handles(); // which hold on to the share handle
     replace_curl_share_handle();
     if (ca_path)
         replace_ca_path(ca_path);
@@ -36,6 +39,8 @@ void api_global_init(const char *ca_path)
 
 void api_global_cleanup(void)
 {
+    drop_kept_handles();
+    forget_certificates();
     curl_global_cleanup();
     std::free(std::exchange(ca_cert_pem_path.path, nullptr));
     cleanup_proxy();

@@ -15,6 +15,7 @@ namespace quillmere {
 
 pthread_mutex_t *tls_mutexes = nullptr;
 int32_t tls_locks_installed = 0;
+bool shares_openssl_with_libcurl = false;
 
 namespace {
 
@@ -38,6 +39,18 @@ bool keep_superseded()
     *kept = {tls_mutexes, superseded};
     superseded = kept;
     return true;
+}
+
+// libcurl's "OpenSSL/3.0.19", perhaps with further libraries behind it, against OpenSSL's own
+// "OpenSSL 3.0.19 27 Jan 2026".
+bool is_our_openssl(const char *ssl_version)
+{
+    constexpr size_t name = sizeof "OpenSSL/" - 1;
+    const char *ours = SSLeay_version(0);
+    size_t length = std::strcspn(ssl_version, " ");
+    return std::strncmp(ssl_version, "OpenSSL/", name) == 0 &&
+           std::strncmp(ours, "OpenSSL ", name) == 0 &&
+           std::strncmp(ours + name, ssl_version + name, length - name) == 0 && ours[length] == ' ';
 }
 
 using mutex_array = std::unique_ptr<pthread_mutex_t, releaser<free_memory>>;
@@ -109,6 +122,7 @@ int32_t tls_init(void)
 {
     const char *ssl_version = curl_version_info(CURLVERSION_FOURTH)->ssl_version;
     qm_printf("Curl SSL version: %s\n", ssl_version);
+    shares_openssl_with_libcurl = ssl_version && is_our_openssl(ssl_version);
     if (!ssl_version || std::strncmp(ssl_version, "OpenSSL", 7) != 0) {
         qm_printf("No OpenSSL support.\n");
         return 0;

@@ -23,6 +23,10 @@ inline constexpr int unlock_bit = 2;
 extern pthread_mutex_t *tls_mutexes;
 extern int32_t tls_locks_installed;
 
+// Whether libcurl's TLS runs on the very OpenSSL that we call ourselves, so that objects of the one
+// may be given to the other. Known after tls_init().
+extern bool shares_openssl_with_libcurl;
+
 extern "C" {
 void tls_locking_callback(int mode, int index, const char *file, int line);
 unsigned long tls_thread_id_callback();

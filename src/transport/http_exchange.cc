@@ -4,6 +4,7 @@
 #include <utility>
 
 #include "owned.h"
+#include "runtime/kept_handles.h"
 #include "runtime/lifecycle.h"
 #include "transport/response_body.h"
 #include "transport/transfer.h"
@@ -52,7 +53,8 @@ void send_body(CURL *handle, const http_request &request)
 }
 
 // Sets everything up for one attempt; false if libcurl refuses what the attempt cannot do without.
-bool prepare(CURL *handle, const http_request &request, error_text &error, response_body &body)
+bool prepare(CURL *handle, const http_request &request, X509_STORE *certificates, error_text &error,
+             response_body &body)
 {
     share_dns_cache(handle);
     curl_easy_setopt(handle, CURLOPT_ERRORBUFFER, error.text);
@@ -62,7 +64,7 @@ bool prepare(CURL *handle, const http_request &request, error_text &error, respo
     keep_no_tls_sessions(handle);
     limit_time(handle, request);
     curl_easy_setopt(handle, CURLOPT_NOPROGRESS, 1L);
-    if (!use_proxy(handle) || !verify_peer(handle))
+    if (!use_proxy(handle) || !verify_peer(handle, certificates))
         return false;
     body.receive_with(handle);
     if (ssl_disabled) {
@@ -83,20 +85,48 @@ void report_failure(CURLcode code, const error_text &error)
         event_handler->function(0, event_handler->argument);
 }
 
-// One attempt: the response code, with the body in received, or -1.
-int64_t attempt(const http_request &request, error_text &error, string_buffer *received)
+// Whether a kept connection had ended before the request was sent whole, so that the request cannot
+// have been carried out. When it ends later, but before a byte of an answer, libcurl itself begins
+// anew; what fails otherwise fails on new connections as well.
+bool was_stale(CURL *handle, CURLcode code)
 {
-    easy_handle handle(curl_easy_init());
+    long new_connections = 0;
+    long redirects = 0;
+    long header_bytes = 0;
+    curl_easy_getinfo(handle, CURLINFO_NUM_CONNECTS, &new_connections);
+    curl_easy_getinfo(handle, CURLINFO_REDIRECT_COUNT, &redirects);
+    curl_easy_getinfo(handle, CURLINFO_HEADER_SIZE, &header_bytes);
+    return code == CURLE_SEND_ERROR && new_connections == 0 && redirects == 0 && header_bytes == 0;
+}
+
+using handle_source = transfer_handle::source;
+
+constexpr int64_t failed = -1;
+constexpr int64_t stale = -2;
+
+// One attempt: the response code, with the body in received, or one of these. What is stale has
+// left no trace.
+int64_t attempt(const http_request &request, handle_source from, error_text &error,
+                string_buffer *received)
+{
+    certificate_store certificates = trusted_certificates(request.url);
     response_body body(received);
-    if (!handle || !prepare(handle.get(), request, error, body))
-        return -1;
+    transfer_handle handle(certificates.get(), from);
+    if (!handle.get() || !prepare(handle.get(), request, certificates.get(), error, body))
+        return failed;
+    error_text before = error;
     CURLcode code = curl_easy_perform(handle.get());
+    if (code != CURLE_OK && handle.is_used() && was_stale(handle.get(), code)) {
+        error = before;
+        return stale;
+    }
     if (code != CURLE_OK) {
         report_failure(code, error);
-        return -1;
+        return failed;
     }
     long response_code = 0;
     curl_easy_getinfo(handle.get(), CURLINFO_RESPONSE_CODE, &response_code);
+    handle.keep();
     return response_code;
 }
 
@@ -124,9 +154,13 @@ int64_t get_response_from_url(const char *url, const void *body, uint64_t body_l
     http_request request = {url, body, body_length, timeout_seconds};
     error_text error;
     // Without a pause between attempts, deliberately: how long to wait is for the caller to know.
+    handle_source from = handle_source::kept;
     for (int32_t left = ca_cert_pem_path.connection_attempts; left > 0; --left) {
         owned_buffer received(string_new(0));
-        int64_t response_code = attempt(request, error, received.get());
+        int64_t response_code = attempt(request, from, error, received.get());
+        from = handle_source::fresh; // whatever failed, the next must not depend on what was kept
+        if (response_code == stale)
+            response_code = attempt(request, from, error, received.get());
         if (response_code >= 0) {
             hand_over(std::move(received), response, response_length);
             return response_code;

@@ -31,7 +31,8 @@ constexpr int32_t send_failed = -6;
 constexpr int32_t receive_failed = -7;
 
 // The proxy and ssl_disabled are for the operations, deliberately: they are not applied here.
-CURLcode connect(CURL *handle, const char *url, bool use_tls, int64_t timeout)
+CURLcode connect(CURL *handle, const char *url, bool use_tls, X509_STORE *certificates,
+                 int64_t timeout)
 {
     curl_easy_setopt(handle, CURLOPT_URL, url);
     curl_easy_setopt(handle, CURLOPT_FOLLOWLOCATION, 1L);
@@ -42,7 +43,7 @@ CURLcode connect(CURL *handle, const char *url, bool use_tls, int64_t timeout)
         curl_easy_setopt(handle, CURLOPT_PORT, tls_port);
         curl_easy_setopt(handle, CURLOPT_USE_SSL, static_cast<long>(CURLUSESSL_ALL));
         keep_no_tls_sessions(handle);
-        if (!verify_peer(handle))
+        if (!verify_peer(handle, certificates))
             return CURLE_OUT_OF_MEMORY;
     }
     curl_easy_setopt(handle, CURLOPT_CONNECT_ONLY, 1L);
@@ -121,7 +122,8 @@ int32_t send_file_new(send_file **connection, const char *url, int32_t use_tls, 
     if (!handle)
         return no_handle;
 
-    CURLcode code = connect(handle.get(), url, use_tls != 0, timeout);
+    certificate_store certificates = use_tls ? trusted_certificates(url) : nullptr;
+    CURLcode code = connect(handle.get(), url, use_tls != 0, certificates.get(), timeout);
     if (code != CURLE_OK) {
         std::printf("Curl error: %s\n", curl_easy_strerror(code));
         return connect_failed;

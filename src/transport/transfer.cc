@@ -3,6 +3,9 @@
 #include <strings.h>
 
 #include "runtime/dns_share.h"
+#include "runtime/kept_certificates.h"
+#include "runtime/kept_handles.h"
+#include "transport/certificate_hook.h"
 
 namespace quillmere {
 
@@ -66,12 +69,27 @@ bool use_proxy(CURL *handle)
     return kept;
 }
 
-bool verify_peer(CURL *handle)
+bool verify_peer(CURL *handle, X509_STORE *certificates)
 {
-    if (ca_cert_pem_path.path)
-        return keep(handle, CURLOPT_CAINFO, ca_cert_pem_path.path);
-    curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 0L);
+    if (!ca_cert_pem_path.path) {
+        curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 0L);
+        return true;
+    }
+    // Set in any case, so that whatever goes wrong without it ends as libcurl says.
+    if (!keep(handle, CURLOPT_CAINFO, ca_cert_pem_path.path))
+        return false;
+    if (certificates && takes_certificates_from_memory())
+        verify_against(handle, certificates);
     return true;
+}
+
+certificate_store trusted_certificates(const char *url)
+{
+    if (!ca_cert_pem_path.path)
+        return nullptr;
+    bool verifies = url && strncasecmp(url, "https:", 6) == 0;
+    bool used = (verifies && takes_certificates_from_memory()) || keeps_connections();
+    return used ? certificates_of(ca_cert_pem_path.path) : nullptr;
 }
 
 void log_failure(CURLcode code, const error_text &error)

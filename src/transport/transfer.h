@@ -25,8 +25,13 @@ void keep_no_tls_sessions(CURL *handle);
 [[nodiscard]] bool use_proxy(CURL *handle);
 
 // Verifies the peer against the configured certificates, or, without any, not at all. The host name
-// is checked in either case.
-[[nodiscard]] bool verify_peer(CURL *handle);
+// is checked in either case. The certificates are those of trusted_certificates(), which must
+// outlive the transfer.
+[[nodiscard]] bool verify_peer(CURL *handle, X509_STORE *certificates);
+
+// The configured certificates, for a transfer that begins with this URL; null if libcurl has to
+// read the file itself, or needs none. Connections are kept as long as they stay the same.
+certificate_store trusted_certificates(const char *url);
 
 // libcurl's text for the last failure of one call. It starts empty and then keeps what libcurl
 // writes.

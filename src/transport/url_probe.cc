@@ -42,7 +42,7 @@ long perform(CURL *handle, const error_text &error)
 
 // Sets everything up; false if libcurl refuses what the probe cannot do without.
 bool prepare(CURL *handle, const char *url, probe_method method, int32_t timeout_milliseconds,
-             error_text &error, response_body &body)
+             X509_STORE *certificates, error_text &error, response_body &body)
 {
     share_dns_cache(handle);
     curl_easy_setopt(handle, CURLOPT_ERRORBUFFER, error.text);
@@ -55,7 +55,7 @@ bool prepare(CURL *handle, const char *url, probe_method method, int32_t timeout
     if (method == probe_method::get)
         body.receive_with(handle);
     curl_easy_setopt(handle, CURLOPT_NOPROGRESS, 1L);
-    return use_proxy(handle) && verify_peer(handle);
+    return use_proxy(handle) && verify_peer(handle, certificates);
 }
 
 // The response code, or -1. A HEAD probe receives no body, so received is for GET alone.
@@ -67,9 +67,11 @@ long probe(const char *url, probe_method method, int32_t timeout_milliseconds,
         qm_printf("Could not initialize cUrl.\n");
         return -1;
     }
+    certificate_store certificates = trusted_certificates(url);
     error_text error;
     response_body body(received);
-    if (!prepare(handle.get(), url, method, timeout_milliseconds, error, body)) {
+    if (!prepare(handle.get(), url, method, timeout_milliseconds, certificates.get(), error,
+                 body)) {
         qm_printf("cUrl setopt failed.\n");
         return -1;
     }

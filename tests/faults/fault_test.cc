@@ -6,6 +6,7 @@
 
 #include "faults/ways.h"
 #include "interpose/libcurl_heap.h"
+#include "runtime/tls_locks.h"
 #include "support/hook_recorder.h"
 #include "support/library_fixture.h"
 #include "support/resources.h"
@@ -69,6 +70,7 @@ protected:
     void check_log(const way &by, const outcome_of_call &outcome, int32_t failures, bool succeeded);
     void check_time(const outcome_of_call &outcome, int32_t attempts) const;
     holdings holdings_at_rest();
+    void check_that_it_ends_as_its_row_says();
 
     proxyless_environment environment;
     globals_guard globals;
@@ -225,7 +227,7 @@ holdings Fault::holdings_at_rest()
     return {open_descriptors(), threads(), libcurl_heap.blocks_held()};
 }
 
-TEST_P(Fault, EndsAsItsRowSays)
+void Fault::check_that_it_ends_as_its_row_says()
 {
     // What libcurl opens once and keeps is open after the first exchange.
     std::optional<holdings> before;
@@ -250,6 +252,16 @@ TEST_P(Fault, EndsAsItsRowSays)
     EXPECT_EQ(hook.calls().size(), 0u);
 }
 
+TEST_P(Fault, EndsAsItsRowSays) { check_that_it_ends_as_its_row_says(); }
+
+// Where libcurl's TLS library is another, it reads the certificates itself.
+class FaultWithCertificatesFromTheFile : public Fault {
+protected:
+    FaultWithCertificatesFromTheFile() { quillmere::shares_openssl_with_libcurl = false; }
+};
+
+TEST_P(FaultWithCertificatesFromTheFile, EndsAsItsRowSays) { check_that_it_ends_as_its_row_says(); }
+
 std::string name_of(const testing::TestParamInfo<trial> &info) { return info.param.name(); }
 
 using testing::ValuesIn;
@@ -260,6 +272,8 @@ INSTANTIATE_TEST_SUITE_P(Malformed, Fault, ValuesIn(trials_of(malformed_replies(
 INSTANTIATE_TEST_SUITE_P(Unexpected, Fault, ValuesIn(trials_of(unexpected_replies())), name_of);
 INSTANTIATE_TEST_SUITE_P(Redirected, Fault, ValuesIn(trials_of(redirect_faults())), name_of);
 INSTANTIATE_TEST_SUITE_P(Certificate, Fault, ValuesIn(trials_of(certificate_faults())), name_of);
+INSTANTIATE_TEST_SUITE_P(Certificate, FaultWithCertificatesFromTheFile,
+                         ValuesIn(trials_of(certificate_faults())), name_of);
 INSTANTIATE_TEST_SUITE_P(Proxied, Fault, ValuesIn(trials_of(proxy_faults())), name_of);
 
 } // namespace

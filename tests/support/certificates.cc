@@ -187,6 +187,28 @@ const certificate &loopback_certificate()
     return leaf;
 }
 
+std::string revocation_list_pem(const certificate_authority &authority, const certificate &revoked)
+{
+    const certificate &issuer = authority.root();
+    std::unique_ptr<ASN1_TIME, decltype(&ASN1_TIME_free)> now(X509_gmtime_adj(nullptr, 0),
+                                                              ASN1_TIME_free);
+    std::unique_ptr<X509_CRL, decltype(&X509_CRL_free)> list(X509_CRL_new(), X509_CRL_free);
+    must(now && list && X509_CRL_set_version(list.get(), X509_CRL_VERSION_2) == 1, "X509_CRL_new");
+    must(X509_CRL_set_issuer_name(list.get(), X509_get_subject_name(issuer.x509())) == 1, "issuer");
+    must(X509_CRL_set1_lastUpdate(list.get(), now.get()) == 1, "lastUpdate");
+
+    std::unique_ptr<X509_REVOKED, decltype(&X509_REVOKED_free)> entry(X509_REVOKED_new(),
+                                                                      X509_REVOKED_free);
+    must(entry && X509_REVOKED_set_revocationDate(entry.get(), now.get()) == 1, "revocationDate");
+    must(X509_REVOKED_set_serialNumber(entry.get(), X509_get_serialNumber(revoked.x509())) == 1,
+         "serial");
+    must(X509_CRL_add0_revoked(list.get(), entry.release()) == 1, "X509_CRL_add0_revoked");
+    must(X509_CRL_sign(list.get(), issuer.key(), EVP_sha256()) > 0, "X509_CRL_sign");
+    memory_bio memory(BIO_new(BIO_s_mem()), BIO_free_all);
+    must(memory && PEM_write_bio_X509_CRL(memory.get(), list.get()) == 1, "PEM_write_bio_X509_CRL");
+    return text_in(memory.get());
+}
+
 certificate expired_certificate()
 {
     leaf_request request;

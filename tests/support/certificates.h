@@ -56,6 +56,9 @@ const std::string &test_root_path();
 // A good leaf of the test root for the loopback names, made once a process.
 const certificate &loopback_certificate();
 
+// PEM of a list in which the authority revokes the certificate.
+std::string revocation_list_pem(const certificate_authority &authority, const certificate &revoked);
+
 certificate expired_certificate();
 certificate not_yet_valid_certificate();
 certificate certificate_for_another_host();

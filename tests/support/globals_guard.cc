@@ -89,6 +89,7 @@ globals_guard::~globals_guard()
     replace_owned_text(ca_cert_pem_path.path, ca_path_);
     restore_proxy();
     set_response_limit(0);
+    set_connection_reuse(0);
 }
 
 void globals_guard::restore_proxy() const

@@ -21,6 +21,11 @@ bool is_text(CURLoption option)
     return std::find(std::begin(texts), std::end(texts), option) != std::end(texts);
 }
 
+std::string text_of(const curl_blob &blob)
+{
+    return std::string(static_cast<const char *>(blob.data), blob.len);
+}
+
 void note(CURLoption option, void *value)
 {
     easy_option noted = {option, 0, "", nullptr};
@@ -28,6 +33,8 @@ void note(CURLoption option, void *value)
         noted.number = reinterpret_cast<intptr_t>(value);
     else if (is_text(option) && value)
         noted.text = static_cast<const char *>(value);
+    else if (option == CURLOPT_CAINFO_BLOB)
+        noted.text = text_of(*static_cast<const curl_blob *>(value));
     else
         noted.pointer = value;
     current->options.push_back(noted);
@@ -38,6 +45,9 @@ void note(CURLoption option, void *value)
 }
 
 } // namespace
+
+const std::vector<CURLoption> memory_options = {CURLOPT_SSL_CTX_DATA, CURLOPT_SSL_CTX_FUNCTION,
+                                                CURLOPT_CAINFO_BLOB};
 
 easy_calls::easy_calls() { current = this; }
 easy_calls::~easy_calls() { current = nullptr; }
@@ -132,6 +142,10 @@ CURLcode watched_getinfo(CURL *handle, int number, ...)
     auto info = static_cast<CURLINFO>(number);
     if (current && current->refused_info == info)
         return CURLE_UNKNOWN_OPTION;
+    if (current && current->told.count(info) > 0) {
+        *static_cast<long *>(answer) = current->told[info];
+        return CURLE_OK;
+    }
     return real_getinfo(handle, info, answer);
 }
 

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <functional>
+#include <map>
 #include <string>
 #include <vector>
 
@@ -10,13 +11,16 @@
 
 namespace quillmere_test {
 
-// Numbers stand in number; texts, copied, in text; other pointers in pointer.
+// Numbers stand in number; texts and blobs, copied, in text; other pointers in pointer.
 struct easy_option {
     CURLoption option;
     long number;
     std::string text;
     const void *pointer;
 };
+
+// What hands over certificates in memory, in its order.
+extern const std::vector<CURLoption> memory_options;
 
 // While it lives, calls to libcurl go by its fields. One at a time, on one thread.
 class easy_calls {
@@ -31,6 +35,7 @@ public:
     CURLcode refusal = CURLE_BAD_FUNCTION_ARGUMENT;      // and how
     std::function<CURLcode(size_t performance)> perform; // instead of a transfer, counted from 1
     CURLINFO refused_info = CURLINFO_NONE;               // what is not told of a handle
+    std::map<CURLINFO, long> told;                       // what is told instead of the truth
     long other_port = 0; // where a connection goes whose port is set; 0: to that port
 
     size_t inits = 0;

@@ -44,7 +44,7 @@ TEST_F(ConnectionOptions, HavePort443AndTheCertificatesWithTls)
 {
     open_connection(url, 1, 0);
 
-    EXPECT_THAT(calls.names(),
+    EXPECT_THAT(calls.names(memory_options),
                 ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
                             CURLOPT_PORT, CURLOPT_USE_SSL, CURLOPT_SSL_SESSIONID_CACHE,
                             CURLOPT_CAINFO, CURLOPT_CONNECT_ONLY));
@@ -75,7 +75,7 @@ TEST_F(ConnectionOptions, AreNotChangedByTheProxyAndSslDisabled)
 
     open_connection(url, 1, 0);
 
-    EXPECT_THAT(calls.names(),
+    EXPECT_THAT(calls.names(memory_options),
                 ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
                             CURLOPT_PORT, CURLOPT_USE_SSL, CURLOPT_SSL_SESSIONID_CACHE,
                             CURLOPT_CAINFO, CURLOPT_CONNECT_ONLY));
