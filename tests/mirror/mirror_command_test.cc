@@ -428,9 +428,6 @@ TEST_F(Mirror, BringsListingsAndFeedsOfSeveralParts)
     mirrored();
 
     EXPECT_EQ(paths().size(), 2 * (1 + 2 * 130u));
-    fs::remove_all(path());
-    mirrored(); // from listings
-    EXPECT_EQ(paths().size(), 2 * (1 + 2 * 130u));
 }
 
 TEST_F(HostileService, LeadsTheMirrorNowhereElse)

@@ -138,9 +138,7 @@ void account_reader::fill(known_account &known)
     refusals_.clear();
     for (bool more = true; more;) {
         more = false;
-        for (const std::string &key : known.unfinished()) {
-            if (refusals_.count(key) != 0)
-                continue;
+        for (const std::string &key : next_unfinished(known)) {
             more = true;
             finish(known, key);
             keep_now_and_then(known);
@@ -148,15 +146,28 @@ void account_reader::fill(known_account &known)
     }
 }
 
+// Listings first, since they describe what the folders hold.
+std::vector<std::string> account_reader::next_unfinished(const known_account &known) const
+{
+    std::vector<std::string> to_list;
+    std::vector<std::string> to_describe;
+    for (const std::string &key : known.unfinished()) {
+        const known_entry &entry = known.entries.at(key);
+        if (refusals_.count(key) == 0)
+            (entry.is_folder() && !entry.listed ? to_list : to_describe).push_back(key);
+    }
+    return to_list.empty() ? to_describe : to_list;
+}
+
 // What is refused may just have been deleted, which the feed will tell.
 void account_reader::finish(known_account &known, const std::string &key)
 {
     try {
         known_entry &entry = known.entries.at(key);
-        if (!entry.described)
-            describe(key, entry);
-        else
+        if (entry.is_folder() && !entry.listed)
             list(known, key);
+        else
+            describe(key, entry);
     } catch (const failure &problem) {
         if (problem.code != exit_code::refused)
             throw;

@@ -47,6 +47,7 @@ private:
     std::optional<news> read_news(const known_account &known);
     bool take_in_news(known_account &known);
     void fill(known_account &known);
+    std::vector<std::string> next_unfinished(const known_account &known) const;
     void finish(known_account &known, const std::string &key);
     void describe(const std::string &key, known_entry &entry);
     void list(known_account &known, const std::string &key);
