@@ -2,6 +2,7 @@
 // body, and one pass of expat over the reply: over TLS to a server in another process.
 //
 //   request_bench BUNDLE      the system's file of certificate authorities
+#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <functional>
@@ -191,6 +192,9 @@ int main(int argc, char **argv)
     std::string root = quillmere_test::test_root_path();
     std::string bundle = folder.write("bundle.pem", quillmere_test::content_of(argv[1]) +
                                                         quillmere_test::content_of(root));
+
+    // What was read from a file that changed a moment ago is not kept.
+    std::this_thread::sleep_for(std::chrono::seconds(4));
 
     quick_server_process server(replies(),
                                 quillmere_test::tls_with(quillmere_test::loopback_certificate()));
