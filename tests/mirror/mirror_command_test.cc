@@ -418,16 +418,26 @@ TEST_F(Mirror, RefusesAFileAsEitherSide)
 
 TEST_F(Mirror, BringsListingsAndFeedsOfSeveralParts)
 {
-    for (int i = 0; i < 130; ++i)
-        fs::create_directories(home.folder().path_of("tree/folder" + std::to_string(i) + "/inner"));
-    mirrored();
-    emulator_command({"put-content", "--account", account_email, "--path", "/tree", "--from",
-                      home.folder().path_of("tree")});
-    done({"cp", "-r", "/tree", "/copied"}); // more than 500 changes with the first
+    for (int i = 0; i < 105; ++i)
+        local("files/file" + std::to_string(i), "");
+    for (int i = 0; i < 260; ++i)
+        fs::create_directories(home.folder().path_of("folders/folder" + std::to_string(i)));
+    const auto put = [this](const std::string &to, const std::string &from) {
+        emulator_command({"put-content", "--account", account_email, "--path", to, "--from",
+                          home.folder().path_of(from)});
+    };
+    put("/files", "sources/files");
 
     mirrored();
 
-    EXPECT_EQ(paths().size(), 2 * (1 + 2 * 130u));
+    EXPECT_EQ(paths().size(), 106u) << "more than a chunk of a listing";
+    put("/folders", "folders");
+    done({"cp", "-r", "/folders", "/copied"});
+    done({"rm", "-r", "/folders"});
+    done({"rm", "-r", "/copied"}); // more than 500 changes, a block of the feed
+    put_content("/last.txt", "last");
+    mirrored();
+    EXPECT_EQ(content_of(path("last.txt")), "last");
 }
 
 TEST_F(HostileService, LeadsTheMirrorNowhereElse)

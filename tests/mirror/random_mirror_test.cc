@@ -251,7 +251,7 @@ private:
 
 TEST_F(RandomMirror, EndsAsTheAccountIsWhateverStoppedIt)
 {
-    for (std::uint32_t round = 0; round < number_in("QUILLMERE_ROUNDS", 4); ++round) {
+    for (std::uint32_t round = 0; round < number_in("QUILLMERE_ROUNDS", 2); ++round) {
         for (int part = 0; part < 3; ++part) {
             change_accounts(8);
             run_hindered();
@@ -274,7 +274,7 @@ TEST_F(RandomMirror, LosesNothingThatTheUserWrote)
 {
     change_accounts(40);
     run_unhindered(shown_tree(listed_account(sessions[ann])).all_shown);
-    for (std::uint32_t round = 0; round < number_in("QUILLMERE_ROUNDS", 4); ++round) {
+    for (std::uint32_t round = 0; round < number_in("QUILLMERE_ROUNDS", 2); ++round) {
         for (int part = 0; part < 2; ++part) {
             change_accounts(8);
             for (int work = 0; work < 3; ++work)
