@@ -45,6 +45,7 @@ struct tried_command {
     std::string name;
     std::string request; ///< its path, upload, or nothing where none is made
     words arguments;
+    bool is_silent = false; ///< about what goes wrong: a shell asks
 };
 
 const std::string upload = "upload";
@@ -79,7 +80,7 @@ const tried_command tried_commands[] = {
     {"set", "/api/folder/update.php", {"key:f", "--tags", "a"}},
     {"put", upload, {"source", "/"}},
     {"get", "/bytes", {"key:k", "into"}},
-    {"mirror", "/api/1.0/folder/get_content.php", {"/", "copy"}},
+    {"mirror", "/api/1.0/folder/get_content.php", {"key:f", "copy"}},
     {"update", upload, {"source", "key:k"}},
     {"links", "/api/file/get_links.php", {"key:k"}},
     {"changes", "/api/device/get_changes.php", {}},
@@ -88,7 +89,7 @@ const tried_command tried_commands[] = {
     {"doctor", "/api/system/get_status.php", {}},
     {"quickstart", "", {}},
     {"completion", "", {"bash"}},
-    {"__complete", "", {"profile", ""}},
+    {"__complete", "/api/1.0/folder/get_content.php", {"remote", "/"}, true},
 };
 
 /** In every reply, whatever was asked for. */
@@ -346,8 +347,11 @@ TEST_P(SecretsInTrouble, AreSeenNowhere)
         const outcome ended = run(what);
 
         expect_hidden(home, ended);
-        expect_end(ended, tried.request.empty() ? tested.end_without_request() : tested.end);
-        EXPECT_EQ(reached() > 0, !tried.request.empty());
+        if (!tried.is_silent)
+            expect_end(ended, tried.request.empty() ? tested.end_without_request() : tested.end);
+        if (!tested.surroundings) { // in some a command gives up before
+            EXPECT_EQ(reached() > 0, !tried.request.empty());
+        }
     }
 }
 
@@ -366,7 +370,8 @@ TEST_F(Secrets, AreSeenNowhereWhenTheServiceCannotBeReached)
         const outcome ended = run(command_in(home, tried, to_nobody));
 
         expect_hidden(home, ended);
-        expect_end(ended, tried.request.empty() ? expected::success : expected::failure);
+        if (!tried.is_silent)
+            expect_end(ended, tried.request.empty() ? expected::success : expected::failure);
     }
 }
 
@@ -384,7 +389,8 @@ TEST_F(Secrets, AreNotSentToAServiceWithoutTrust)
         const outcome ended = run(command_in(home, tried, {"--ca-file", other_root}));
 
         expect_hidden(home, ended);
-        expect_end(ended, tried.request.empty() ? expected::success : expected::failure);
+        if (!tried.is_silent)
+            expect_end(ended, tried.request.empty() ? expected::success : expected::failure);
         EXPECT_EQ(reached(), 0U);
     }
 }

@@ -20,6 +20,7 @@ namespace {
 
 [[noreturn]] void become(const command &what)
 {
+    ::signal(SIGINT, SIG_DFL); // whatever started the tests may ignore it
     for (const auto &[name, value] : what.environment) {
         if (value)
             ::setenv(name.c_str(), value->c_str(), 1);
