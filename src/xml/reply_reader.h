@@ -61,7 +61,7 @@ private:
         int64_t depth_ = -1;   // of the root's parent; the root's is 0
         int64_t lost_at_ = -1; // depth from which on the path is too long, if it is
         size_t length_ = 0;
-        char text_[longest_path];
+        char text_[longest_path] = {};
     };
 
     struct lookup {
@@ -81,7 +81,7 @@ private:
     XML_Parser parser_ = nullptr;
     open_path path_;
     lookup lookups_[most_lookups];
-    uint8_t collecting_[most_lookups]; // the rows of those that do, in no order
+    uint8_t collecting_[most_lookups] = {}; // the rows of those that do, in no order
     size_t collecting_count_ = 0;
     size_t next_row_ = 0; // behind the one taken last
 };
