@@ -155,9 +155,6 @@ void folder_content_extraction::end(const char *element)
         folders_.add(std::move(folder_));
     else if (is(element, "file"))
         files_.add(std::move(file_));
-    else
-        return;
-    place_ = place::outside;
 }
 
 void folder_content_extraction::discard()

@@ -112,7 +112,8 @@ public:
     void text(const char *piece, int length) override { target_.append(piece, length); }
 
 private:
-    enum class place { outside, folder, file };
+    // Where the record started last is; once it has ended, there is no record in that place.
+    enum class place { folder, file };
 
     void discard() override;
 
@@ -123,7 +124,7 @@ private:
     joined_text folder_texts_[19];
     joined_text file_texts_[18];
     text_target target_;
-    place place_ = place::outside;
+    place place_ = place::folder;
 };
 
 // A device change feed.

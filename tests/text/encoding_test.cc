@@ -98,6 +98,38 @@ TEST(EncodedAppend, GrowsTheBufferByWhatItAppends)
     EXPECT_EQ(buffer->capacity, 6u);
 }
 
+// Both the storage and the text behind it are what appending the encoded text would have made,
+// however much room there was.
+TEST(EncodedAppend, GrowsAsForAnyOtherText)
+{
+    const std::pair<std::string, std::string> texts[] = {{"", ""},
+                                                         {"a", "a"},
+                                                         {"/", "%2f"},
+                                                         {"abc", "abc"},
+                                                         {"//", "%2f%2f"},
+                                                         {"a/b", "a%2fb"},
+                                                         {"///", "%2f%2f%2f"},
+                                                         {"abcdef", "abcdef"},
+                                                         {"/abc", "%2fabc"},
+                                                         {"abc//", "abc%2f%2f"}};
+    for (const auto &[text, encoded] : texts) {
+        for (uint64_t capacity = 0; capacity < 40; ++capacity) {
+            SCOPED_TRACE(text + " in " + std::to_string(capacity));
+            owned_buffer buffer = new_buffer(capacity);
+            owned_buffer expected = new_buffer(capacity);
+            string_append(buffer.get(), "begun");
+            string_append(expected.get(), "begun");
+
+            string_append_urlencode(buffer.get(), text.c_str());
+            string_append(expected.get(), encoded.c_str());
+
+            EXPECT_STREQ(string_get(buffer.get()), string_get(expected.get()));
+            EXPECT_EQ(buffer->length, expected->length);
+            EXPECT_EQ(buffer->capacity, expected->capacity);
+        }
+    }
+}
+
 TEST(EncodedAppend, TakesALongText)
 {
     owned_buffer buffer = new_buffer();
