@@ -19,6 +19,7 @@
 #include "support/library_fixture.h"
 #include "support/quick_server.h"
 #include "support/temporary_folder.h"
+#include "support/unread_log.h"
 
 namespace {
 
@@ -188,6 +189,7 @@ int main(int argc, char **argv)
         return 2;
     }
     quillmere_test::proxyless_environment environment;
+    quillmere_test::unread_log log; // written all the same
     quillmere_test::temporary_folder folder;
     std::string root = quillmere_test::test_root_path();
     std::string bundle = folder.write("bundle.pem", quillmere_test::content_of(argv[1]) +
