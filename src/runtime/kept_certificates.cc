@@ -8,6 +8,7 @@
 
 #include <openssl/err.h>
 #include <openssl/pem.h>
+#include <openssl/x509v3.h>
 #include <sys/stat.h>
 
 namespace quillmere {
@@ -92,6 +93,26 @@ certificate_store read_certificates(BIO *file)
     return holds_something ? std::move(certificates) : nullptr;
 }
 
+// OpenSSL decodes the key of a certificate when it reads it, and the extensions when it first needs
+// them. An object in which that failed once, for want of memory say, is never good again.
+bool decoded(X509 *certificate)
+{
+    EVP_PKEY *key = X509_get0_pubkey(certificate);
+    return key && EVP_PKEY_security_bits(key) > 0 && X509_check_purpose(certificate, -1, 0) == 1;
+}
+
+// Only such are kept. A file with what OpenSSL cannot decode at all is read for each connection.
+bool decoded(X509_STORE *certificates)
+{
+    STACK_OF(X509_OBJECT) *items = X509_STORE_get0_objects(certificates);
+    for (int i = 0; i < sk_X509_OBJECT_num(items); ++i) {
+        X509 *certificate = X509_OBJECT_get0_X509(sk_X509_OBJECT_value(items, i));
+        if (certificate && !decoded(certificate))
+            return false;
+    }
+    return true;
+}
+
 certificate_store read_and_keep(const char *path)
 {
     errors_undone undone;
@@ -104,8 +125,8 @@ certificate_store read_and_keep(const char *path)
     certificate_store certificates(bio ? read_certificates(bio.get()) : nullptr);
 
     struct stat after = {};
-    if (certificates && settled(before, now) && fstat(fileno(file.get()), &after) == 0 &&
-        same(before, after))
+    if (certificates && settled(before, now) && decoded(certificates.get()) &&
+        fstat(fileno(file.get()), &after) == 0 && same(before, after))
         kept = {before, another_reference(certificates.get()).release()};
     return certificates;
 }

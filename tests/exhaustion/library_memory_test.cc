@@ -7,7 +7,9 @@
 #include "exhaustion/file_service.h"
 #include "exhaustion/library_memory.h"
 #include "exhaustion/subject.h"
+#include "interpose/clock.h"
 #include "interpose/heap.h"
+#include "runtime/kept_certificates.h"
 #include "support/quick_server.h"
 
 namespace quillmere_test {
@@ -206,6 +208,9 @@ bool is_failure(const call_outcome &outcome)
 // The transfers on a server, plain and TLS, with all that a connection takes.
 class StarvedTransfers : public testing::Test {
 protected:
+    // OpenSSL that ran out of memory may leave libcurl waiting for what never comes.
+    StarvedTransfers() { set_default_timeout(5); }
+
     static std::string reply(const request &) { return http_reply(200, "answer"); }
 
     void starve(memory_of library, const subject &starved, size_t step = 1)
@@ -232,6 +237,10 @@ protected:
     file_service quiet{test_root_path().c_str()};
 };
 
+// Thousands of allocations of OpenSSL go into each connection. All of them are tried with
+// QUILLMERE_EVERY_ALLOCATION set, which takes minutes.
+const size_t shortage_step = std::getenv("QUILLMERE_EVERY_ALLOCATION") ? 1 : 7;
+
 TEST_F(StarvedTransfers, OfLibcurlAreFailedAttempts)
 {
     for (const subject &each : transfer_subjects(plain_server.base_url()))
@@ -253,14 +262,31 @@ TEST_F(StarvedTransfers, OfLibcurlNeverGoPastTheProxy)
     starve(memory_of::libcurl, transfer_subjects(plain_server.base_url()).front());
 }
 
-// Thousands of allocations go into each connection. All of them are tried with
-// QUILLMERE_EVERY_ALLOCATION set, which takes minutes.
 TEST_F(StarvedTransfers, OfOpensslAreFailedAttempts)
 {
     ASSERT_TRUE(openssl_is_hooked);
-    size_t step = std::getenv("QUILLMERE_EVERY_ALLOCATION") ? 1 : 7;
 
-    starve(memory_of::openssl, transfer_subjects(tls_server.base_url()).front(), step);
+    starve(memory_of::openssl, transfer_subjects(tls_server.base_url()).front(), shortage_step);
+}
+
+// What is kept for later requests must not remember a shortage of an earlier one.
+TEST_F(StarvedTransfers, OfOpensslLeaveTheKeptCertificatesWhole)
+{
+    const pretended_time an_hour_later(std::time(nullptr) + 3600); // so that they are kept at once
+    const subject fetching = transfer_subjects(tls_server.base_url()).front();
+    const call_outcome fed = fed_outcome(memory_of::openssl, fetching);
+
+    for (bool kept_before : {false, true})
+        for (size_t allowed = 0;; allowed += shortage_step) {
+            SCOPED_TRACE(std::to_string(allowed) + (kept_before ? ", kept" : ", not yet kept"));
+            if (!kept_before)
+                quillmere::forget_certificates();
+            const library_run run =
+                quillmere_test::starve(memory_of::openssl, fetching, {allowed, 1});
+            ASSERT_EQ(fed_outcome(memory_of::openssl, fetching), fed);
+            if (run.refused == 0)
+                break;
+        }
 }
 
 } // namespace
