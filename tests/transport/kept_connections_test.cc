@@ -52,6 +52,14 @@ void answer_one_and_reset_within_the_next(connection &client)
     client.reset();
 }
 
+void answer_one_and_cut_off_the_next(connection &client)
+{
+    answer(client);
+    client.read_request();
+    client.send(reply.substr(0, reply.size() - 1));
+    client.close();
+}
+
 // Nothing is verified, so that no certificate file has to settle.
 class KeptConnections : public library_test, public testing::WithParamInterface<bool> {
 protected:
@@ -192,13 +200,7 @@ TEST_P(KeptConnections, AreReplacedByNewOnesWhoseFailureCounts)
 
 TEST_P(KeptConnections, AreNotReplacedForAnAnswerThatIsCutOff)
 {
-    asked().next({[](connection &client) {
-                      answer(client);
-                      client.read_request();
-                      client.send(reply.substr(0, reply.size() - 1));
-                      client.close();
-                  },
-                  answer_all});
+    asked().next({answer_one_and_cut_off_the_next, answer_all});
     ASSERT_EQ(code(), 200);
 
     EXPECT_EQ(code(), -1);
@@ -213,13 +215,7 @@ TEST_P(KeptConnections, AreNotReplacedForAnAnswerThatIsCutOff)
 TEST_P(KeptConnections, AreNotUsedForTheAttemptsAfterAFailure)
 {
     set_connection_attempts(2);
-    asked().next({[](connection &client) {
-                      answer(client);
-                      client.read_request();
-                      client.send(reply.substr(0, reply.size() - 1));
-                      client.close();
-                  },
-                  answer_all});
+    asked().next({answer_one_and_cut_off_the_next, answer_all});
     ASSERT_EQ(code(), 200);
 
     EXPECT_EQ(code(), 200);
