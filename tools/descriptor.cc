@@ -2,6 +2,7 @@
 
 #include <array>
 #include <cerrno>
+#include <vector>
 
 #include <fcntl.h>
 
@@ -34,6 +35,19 @@ bool read_all(int number, std::size_t limit, std::string &text)
             errno = EFBIG;
             return false;
         }
+    }
+}
+
+bool read_pieces(int number, const std::function<void(std::string_view piece)> &take)
+{
+    std::vector<char> piece(256 * 1024);
+    for (;;) {
+        const ssize_t count = ::read(number, piece.data(), piece.size());
+        if (count < 0 && errno == EINTR)
+            continue;
+        if (count <= 0)
+            return count == 0;
+        take({piece.data(), static_cast<std::size_t>(count)});
     }
 }
 

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <cstddef>
+#include <functional>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -42,6 +43,9 @@ bool write_all(int number, std::string_view bytes);
  * More than limit bytes count as a failure with EFBIG.
  */
 bool read_all(int number, std::size_t limit, std::string &text);
+
+/** Hands on all that can be read, piece by piece; false with errno set after a failure. */
+bool read_pieces(int number, const std::function<void(std::string_view piece)> &take);
 
 /** Points the closed ones of descriptors 0, 1 and 2 at /dev/null, so that no file of ours becomes
  * one of them by accident. */

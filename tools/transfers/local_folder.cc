@@ -1,7 +1,6 @@
 #include "local_folder.h"
 
 #include <cerrno>
-#include <vector>
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -14,7 +13,6 @@ namespace quillmere::tools {
 namespace {
 
 constexpr int folder_flags = O_RDONLY | O_DIRECTORY | O_CLOEXEC;
-constexpr std::size_t piece_bytes = 256 * 1024;
 
 descriptor opened_folder(int folder, const std::string &name, int more_flags,
                          const std::string &path)
@@ -76,12 +74,9 @@ bool local_folder::has(const std::string &name, const expected_content &content)
         static_cast<std::uint64_t>(facts.st_size) != content.size)
         return false;
     sha256_sum sum;
-    std::vector<char> piece(piece_bytes);
-    for (ssize_t got; (got = ::read(file.number(), piece.data(), piece.size())) != 0;) {
-        if (got < 0)
-            return false;
-        sum.add({piece.data(), static_cast<std::size_t>(got)});
-    }
+    const auto add = [&sum](std::string_view piece) { sum.add(piece); };
+    if (!read_pieces(file.number(), add))
+        return false;
     return hex_of(sum.finish()) == content.sha256;
 }
 

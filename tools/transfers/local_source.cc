@@ -17,22 +17,10 @@ namespace {
 
 namespace fs = std::filesystem;
 
-constexpr std::size_t piece_bytes = 256 * 1024;
-
-/** Reads to the end, and hands on each piece. */
-template <class Take> void read_pieces(int file, const std::string &path, Take take)
+template <class Take> void take_all(int file, const std::string &path, const Take &take)
 {
-    std::vector<char> piece(piece_bytes);
-    for (;;) {
-        const ssize_t got = ::read(file, piece.data(), piece.size());
-        if (got < 0 && errno == EINTR)
-            continue;
-        if (got < 0)
-            throw file_failure("cannot read " + path, errno);
-        if (got == 0)
-            return;
-        take(std::string_view(piece.data(), static_cast<std::size_t>(got)));
-    }
+    if (!read_pieces(file, take))
+        throw file_failure("cannot read " + path, errno);
 }
 
 // Without a name it is gone whenever the program ends.
@@ -62,7 +50,7 @@ local_source open_source(const std::string &path)
                       "of a pipe, use - and feed it to standard input");
     local_source opened = {path, std::move(file), 0, {}};
     sha256_sum sum;
-    read_pieces(opened.file.number(), path, [&](std::string_view piece) {
+    take_all(opened.file.number(), path, [&](std::string_view piece) {
         sum.add(piece);
         opened.size += piece.size();
     });
@@ -74,7 +62,7 @@ local_source take_standard_input()
 {
     local_source taken = {"standard input", unnamed_file(), 0, {}};
     sha256_sum sum;
-    read_pieces(STDIN_FILENO, taken.path, [&](std::string_view piece) {
+    take_all(STDIN_FILENO, taken.path, [&](std::string_view piece) {
         if (!write_all(taken.file.number(), piece))
             throw file_failure("cannot keep standard input in a temporary file", errno);
         sum.add(piece);

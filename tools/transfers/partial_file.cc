@@ -2,7 +2,6 @@
 
 #include <cerrno>
 #include <cstdio>
-#include <vector>
 
 #include <fcntl.h>
 #include <sys/file.h>
@@ -11,12 +10,6 @@
 #include "../failure.h"
 
 namespace quillmere::tools {
-
-namespace {
-
-constexpr std::size_t piece_bytes = 256 * 1024;
-
-} // namespace
 
 // The digest is in the name, so that the beginning of other bytes is never taken for that of these,
 // and a name of any length has room.
@@ -62,18 +55,12 @@ bool partial_file::open()
 
 void partial_file::take_in_what_is_there()
 {
-    std::vector<char> piece(piece_bytes);
-    for (;;) {
-        const ssize_t got = ::read(file_.number(), piece.data(), piece.size());
-        if (got < 0 && errno == EINTR)
-            continue;
-        if (got < 0)
-            throw file_failure("cannot read " + name_, errno);
-        if (got == 0)
-            return;
-        sum_.add({piece.data(), static_cast<std::size_t>(got)});
-        size_ += static_cast<std::uint64_t>(got);
-    }
+    const auto take = [this](std::string_view piece) {
+        sum_.add(piece);
+        size_ += piece.size();
+    };
+    if (!read_pieces(file_.number(), take))
+        throw file_failure("cannot read " + name_, errno);
 }
 
 void partial_file::append(std::string_view piece)
