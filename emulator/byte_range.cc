@@ -11,15 +11,6 @@ namespace {
 
 constexpr std::uint64_t any = std::numeric_limits<std::uint64_t>::max();
 
-std::string_view trimmed(std::string_view text)
-{
-    constexpr std::string_view blanks = " \t";
-    const std::size_t first = text.find_first_not_of(blanks);
-    if (first == std::string_view::npos)
-        return {};
-    return text.substr(first, text.find_last_not_of(blanks) - first + 1);
-}
-
 bool is_bytes_unit(std::string_view unit)
 {
     constexpr std::string_view bytes = "bytes";

@@ -11,11 +11,6 @@
 namespace emulator {
 namespace {
 
-[[noreturn]] void fail(const std::string &what)
-{
-    throw std::system_error(errno, std::generic_category(), what);
-}
-
 /** A name that is gone at the end of the scope, unless it has become another by then. */
 class temporary_name {
 public:
@@ -32,6 +27,11 @@ private:
 
 } // namespace
 
+void fail_by_errno(const std::string &what)
+{
+    throw std::system_error(errno, std::generic_category(), what);
+}
+
 descriptor::~descriptor()
 {
     if (number_ >= 0)
@@ -43,7 +43,7 @@ void write_all(int descriptor, std::string_view text)
     while (!text.empty()) {
         const ssize_t written = ::write(descriptor, text.data(), text.size());
         if (written < 0 && errno != EINTR)
-            fail("write");
+            fail_by_errno("write");
         if (written > 0)
             text.remove_prefix(static_cast<std::size_t>(written));
     }
@@ -58,15 +58,15 @@ void write_file(const std::filesystem::path &path, std::string_view text, mode_t
         const descriptor file(
             ::open(temporary.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, mode));
         if (file.number() < 0)
-            fail(temporary);
+            fail_by_errno(temporary);
         if (::fchmod(file.number(), mode) != 0) // whatever the umask says
-            fail(temporary);
+            fail_by_errno(temporary);
         write_all(file.number(), text);
         if (::fsync(file.number()) != 0)
-            fail(temporary);
+            fail_by_errno(temporary);
     }
     if (::rename(temporary.c_str(), path.c_str()) != 0)
-        fail(path.string());
+        fail_by_errno(path.string());
 }
 
 std::string read_descriptor(int descriptor, std::size_t largest)
@@ -76,7 +76,7 @@ std::string read_descriptor(int descriptor, std::size_t largest)
     for (;;) {
         const ssize_t got = ::read(descriptor, piece, sizeof piece);
         if (got < 0 && errno != EINTR)
-            fail("read");
+            fail_by_errno("read");
         if (got == 0)
             return text;
         if (got > 0)
@@ -90,7 +90,7 @@ std::string read_file(const std::filesystem::path &path, std::size_t largest)
 {
     const descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
     if (file.number() < 0)
-        fail(path.string());
+        fail_by_errno(path.string());
     return read_descriptor(file.number(), largest);
 }
 

@@ -23,6 +23,9 @@ private:
     int number_;
 };
 
+/** Throws std::system_error, with what errno says. */
+[[noreturn]] void fail_by_errno(const std::string &what);
+
 /** Writes all of it or throws std::system_error. */
 void write_all(int descriptor, std::string_view text);
 

@@ -14,15 +14,6 @@ constexpr const char *disposition_field = "Content-Disposition";
 
 bool is_blank(char byte) { return byte == ' ' || byte == '\t'; }
 
-std::string_view trimmed(std::string_view text)
-{
-    while (!text.empty() && is_blank(text.front()))
-        text.remove_prefix(1);
-    while (!text.empty() && is_blank(text.back()))
-        text.remove_suffix(1);
-    return text;
-}
-
 std::string lower_case(std::string_view text)
 {
     std::string lowered(text);

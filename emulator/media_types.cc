@@ -6,7 +6,7 @@
 namespace emulator {
 namespace {
 
-constexpr media_type known[] = {
+constexpr media_type known_types[] = {
     {"jpg", "image", "image/jpeg"},
     {"jpeg", "image", "image/jpeg"},
     {"png", "image", "image/png"},
@@ -55,9 +55,9 @@ const media_type &media_type_of(std::string_view name)
         return each >= 'A' && each <= 'Z' ? static_cast<char>(each - 'A' + 'a') : each;
     });
     const auto found =
-        std::find_if(std::begin(known), std::end(known),
+        std::find_if(std::begin(known_types), std::end(known_types),
                      [&extension](const media_type &row) { return extension == row.extension; });
-    return found == std::end(known) ? other : *found;
+    return found == std::end(known_types) ? other : *found;
 }
 
 } // namespace emulator

@@ -111,4 +111,13 @@ std::optional<std::uint64_t> parse_decimal(std::string_view text, std::uint64_t 
     return value;
 }
 
+std::string_view trimmed(std::string_view text)
+{
+    constexpr std::string_view blanks = " \t";
+    const std::size_t first = text.find_first_not_of(blanks);
+    if (first == std::string_view::npos)
+        return {};
+    return text.substr(first, text.find_last_not_of(blanks) - first + 1);
+}
+
 } // namespace emulator

@@ -20,4 +20,7 @@ std::optional<std::string> percent_decoded(std::string_view encoded);
 /** The value of a decimal number without sign or blanks, or nothing if it is none or too large. */
 std::optional<std::uint64_t> parse_decimal(std::string_view text, std::uint64_t largest);
 
+/** Without the blanks and tabs around it that may stand around what a header field says. */
+std::string_view trimmed(std::string_view text);
+
 } // namespace emulator

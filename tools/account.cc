@@ -3,25 +3,24 @@
 #include "commands/commands.h"
 #include "failure.h"
 #include "folder_content.h"
+#include "text.h"
 
 namespace quillmere::tools {
 
 namespace {
 
-std::string text_of(const char *text) { return text == nullptr ? "" : text; }
-
 remote_entry entry_of(const folder_info *record)
 {
-    return {entry_kind::folder, text_of(folder_info_get_folderkey(record)),
-            text_of(folder_info_get_foldername(record)),
-            text_of(folder_info_get_parent_folderkey(record))};
+    return {entry_kind::folder, text_or_empty(folder_info_get_folderkey(record)),
+            text_or_empty(folder_info_get_foldername(record)),
+            text_or_empty(folder_info_get_parent_folderkey(record))};
 }
 
 remote_entry entry_of(const file_info *record)
 {
-    return {entry_kind::file, text_of(file_info_get_quickkey(record)),
-            text_of(file_info_get_filename(record)),
-            text_of(file_info_get_parent_folderkey(record))};
+    return {entry_kind::file, text_or_empty(file_info_get_quickkey(record)),
+            text_or_empty(file_info_get_filename(record)),
+            text_or_empty(file_info_get_parent_folderkey(record))};
 }
 
 template <class Record>

@@ -10,7 +10,7 @@ namespace quillmere::tools {
 
 namespace {
 
-constexpr const char *what = "the emulator's ready file";
+constexpr const char *ready_file_name = "the emulator's ready file";
 
 } // namespace
 
@@ -19,7 +19,8 @@ emulator_address read_ready_text(const std::string &text, const std::string &pat
     const nlohmann::json document = nlohmann::json::parse(text, nullptr, false);
     const auto text_of = [&](const char *key) {
         if (!document.is_object() || !document.contains(key) || !document[key].is_string())
-            throw failure(exit_code::local_file, std::string(what) + " " + path + " has no " + key,
+            throw failure(exit_code::local_file,
+                          std::string(ready_file_name) + " " + path + " has no " + key,
                           "is it the file named with --ready-file?");
         return document[key].get<std::string>();
     };
@@ -34,7 +35,7 @@ emulator_address read_ready_text(const std::string &text, const std::string &pat
 
 emulator_address read_ready_file(const std::string &path)
 {
-    return read_ready_text(read_small_file(path, what), path);
+    return read_ready_text(read_small_file(path, ready_file_name), path);
 }
 
 } // namespace quillmere::tools

@@ -7,8 +7,6 @@ namespace quillmere::tools {
 
 namespace {
 
-constexpr field_value number = field_value::number;
-
 constexpr record_field<folder_info> folder_fields[] = {
     {"key", "Key", folder_info_get_folderkey},
     {"name", "Name", folder_info_get_foldername},
@@ -18,14 +16,14 @@ constexpr record_field<folder_info> folder_fields[] = {
     {"description", "Description", folder_info_get_desc},
     {"tags", "Tags", folder_info_get_tags},
     {"privacy", "Privacy", folder_info_get_privacy},
-    {"revision", "Revision", folder_info_get_revision, number},
-    {"epoch", "Epoch", folder_info_get_epoch, number},
-    {"folder_count", "Folders", folder_info_get_foldercount, number},
-    {"file_count", "Files", folder_info_get_filecount, number},
-    {"byte_count", "Bytes", folder_info_get_byte_count, number},
-    {"total_folders", "Folders, all levels", folder_info_get_total_folders, number},
-    {"total_files", "Files, all levels", folder_info_get_total_files, number},
-    {"total_size", "Bytes, all levels", folder_info_get_total_size, number},
+    {"revision", "Revision", folder_info_get_revision, field_value::number},
+    {"epoch", "Epoch", folder_info_get_epoch, field_value::number},
+    {"folder_count", "Folders", folder_info_get_foldercount, field_value::number},
+    {"file_count", "Files", folder_info_get_filecount, field_value::number},
+    {"byte_count", "Bytes", folder_info_get_byte_count, field_value::number},
+    {"total_folders", "Folders, all levels", folder_info_get_total_folders, field_value::number},
+    {"total_files", "Files, all levels", folder_info_get_total_files, field_value::number},
+    {"total_size", "Bytes, all levels", folder_info_get_total_size, field_value::number},
     {"owner_name", "Owner", folder_info_get_owner_name},
     {"shared", "Shared", folder_info_get_shared},
     {"shared_by_user", "Shared by you", folder_info_get_shared_by_user},
@@ -45,12 +43,12 @@ constexpr record_field<file_info> file_fields[] = {
     {"description", "Description", file_info_get_desc},
     {"tags", "Tags", file_info_get_tags},
     {"privacy", "Privacy", file_info_get_privacy},
-    {"revision", "Revision", file_info_get_revision, number},
-    {"size", "Size", file_info_get_size, number},
+    {"revision", "Revision", file_info_get_revision, field_value::number},
+    {"size", "Size", file_info_get_size, field_value::number},
     {"hash", "Hash", file_info_get_hash},
     {"filetype", "Type", file_info_get_type},
     {"mimetype", "Media type", file_info_get_mimetype},
-    {"downloads", "Downloads", file_info_get_downloads, number},
+    {"downloads", "Downloads", file_info_get_downloads, field_value::number},
     {"owner_name", "Owner", file_info_get_owner_name},
     {"shared_by_user", "Shared by you", file_info_get_shared_by_user},
     {"permissions", "Permissions", file_info_get_permissions},

@@ -52,7 +52,7 @@ constexpr refusal_advice refusals[] = {
     {128, "send it again: it may have changed while it was read"},
 };
 
-const char *advice_against(std::int32_t number)
+const char *advice_on_status(std::int32_t number)
 {
     for (const refusal_advice &each : refusals)
         if (each.number == number)
@@ -132,7 +132,7 @@ failure refusal(const exchange &ended, const std::string &action)
     if (ended.status > 0)
         return failure(exit_code::refused,
                        action + " failed: " + std::to_string(ended.status) + ": " + said,
-                       advice_against(ended.status));
+                       advice_on_status(ended.status));
     return failure(exit_code::refused,
                    action + " failed: refused without a usable error number: " + said,
                    "run it again with --verbose to see the answer");

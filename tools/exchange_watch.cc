@@ -14,7 +14,7 @@ namespace {
 constexpr std::size_t body_kept = 2048;
 constexpr std::size_t line_kept = 1024;
 constexpr std::string_view error_beginning = "cUrl error: (";
-constexpr int timed_out = 28; // of libcurl
+constexpr int libcurl_timed_out = 28; // of libcurl
 
 std::optional<int> take_code(std::string_view &line)
 {
@@ -55,7 +55,7 @@ std::optional<transfer_error> read_upload_error(std::string_view line)
         return std::nullopt;
     line.remove_prefix(moving.size());
     if (ends_with(line, "timeout."))
-        return transfer_error{timed_out, "nothing moved for 60 seconds"};
+        return transfer_error{libcurl_timed_out, "nothing moved for 60 seconds"};
     const auto code = take_code(line);
     if (!code)
         return std::nullopt;

@@ -14,9 +14,9 @@ namespace quillmere::tools {
 
 namespace {
 
-constexpr std::string_view known_keys[] = {"app_id",       "app_key", "app_key_file", "ca_file",
-                                           "email",        "proxy",   "retries",      "service",
-                                           "session_file", "timeout"};
+constexpr std::string_view profile_keys[] = {"app_id",       "app_key", "app_key_file", "ca_file",
+                                             "email",        "proxy",   "retries",      "service",
+                                             "session_file", "timeout"};
 
 /** What people may try to write into the file, and where it belongs. */
 struct secret_key {
@@ -75,8 +75,8 @@ void check_key(const std::string &key, const std::string &place)
     for (const secret_key &each : secret_keys)
         if (lower_case(key) == each.key)
             reject(place, std::string(each.name) + " must not stand here", each.advice);
-    if (std::find(std::begin(known_keys), std::end(known_keys), key) == std::end(known_keys))
-        reject(place, "unknown key " + key, "the keys are " + listed(known_keys));
+    if (std::find(std::begin(profile_keys), std::end(profile_keys), key) == std::end(profile_keys))
+        reject(place, "unknown key " + key, "the keys are " + listed(profile_keys));
 }
 
 entry read_entry(std::string_view line, const std::string &place)

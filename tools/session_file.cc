@@ -12,7 +12,7 @@ namespace quillmere::tools {
 
 namespace {
 
-constexpr const char *what = "the session file";
+constexpr const char *session_file_name = "the session file";
 
 std::string text_of(const nlohmann::json &document, const char *key)
 {
@@ -41,7 +41,8 @@ session read_session(const std::string &text, const std::string &path)
         current.token = text_of(document, "session_token");
     }
     if (current.service.empty() || current.token.empty() || !can_be_sent(current.token))
-        throw failure(exit_code::local_file, std::string(what) + " " + path + " is damaged",
+        throw failure(exit_code::local_file,
+                      std::string(session_file_name) + " " + path + " is damaged",
                       "sign in again with: quillmere login");
     return current;
 }
@@ -55,7 +56,7 @@ std::string session_path(const environment &surroundings)
 
 std::optional<session> session_file::load() const
 {
-    const auto found = read_private_file(path_, what);
+    const auto found = read_private_file(path_, session_file_name);
     if (!found)
         return std::nullopt;
     if (found->found == privacy::repaired)
@@ -72,13 +73,13 @@ void session_file::save(const session &current) const
         {"service", current.service}, {"email", current.email}, {"session_token", current.token}};
     // Bytes that are no UTF-8 cannot stand in JSON, and a token with other bytes is another token.
     try {
-        write_private_file(path_, document.dump(2) + "\n", what, folder_);
+        write_private_file(path_, document.dump(2) + "\n", session_file_name, folder_);
     } catch (const nlohmann::json::exception &) {
         throw failure(exit_code::unreadable_answer, "the service gave a token that is no text",
                       "run it again with --verbose to see the answer");
     }
 }
 
-bool session_file::remove() const { return remove_file(path_, what); }
+bool session_file::remove() const { return remove_file(path_, session_file_name); }
 
 } // namespace quillmere::tools

@@ -137,6 +137,13 @@ nlohmann::ordered_json text_or_null(const char *text)
     return text == nullptr ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
 }
 
+nlohmann::ordered_json text_unless_empty(const std::string &text)
+{
+    return text.empty() ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
+}
+
+std::string text_or_empty(const char *text) { return text == nullptr ? "" : text; }
+
 std::string lower_case(std::string_view text)
 {
     std::string lower(text);

@@ -33,6 +33,12 @@ nlohmann::ordered_json number_or_text(const char *text);
 /** What the service sent as a text: null if it is NULL. */
 nlohmann::ordered_json text_or_null(const char *text);
 
+/** A text of ours that may be missing: null if it is empty. */
+nlohmann::ordered_json text_unless_empty(const std::string &text);
+
+/** A text for which NULL is as good as none. */
+std::string text_or_empty(const char *text);
+
 /** ASCII only, whatever the locale. */
 std::string lower_case(std::string_view text);
 std::string_view trimmed(std::string_view text);

@@ -28,7 +28,7 @@ void check_signature(const call &asked, const std::string &credentials)
         throw refusal(error::signature_wrong);
 }
 
-std::int64_t known(const std::optional<std::int64_t> &account)
+std::int64_t known_account(const std::optional<std::int64_t> &account)
 {
     if (!account)
         throw refusal(error::credentials_wrong);
@@ -40,14 +40,14 @@ std::int64_t sign_in_with_password(const call &asked)
     const std::string &email = asked.required("email");
     const std::string &password = asked.required("password");
     check_signature(asked, email + password);
-    return known(authenticate(asked.state.store, email, password));
+    return known_account(authenticate(asked.state.store, email, password));
 }
 
 std::int64_t sign_in_with_facebook(const call &asked)
 {
     const std::string &token = asked.required("fb_access_token");
     check_signature(asked, token);
-    return known(authenticate_facebook(asked.state.store, token));
+    return known_account(authenticate_facebook(asked.state.store, token));
 }
 
 // Address and password count when both are there, as they do for the client's signature.

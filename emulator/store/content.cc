@@ -16,15 +16,10 @@ namespace {
 
 constexpr std::size_t piece_bytes = 64 * 1024;
 
-[[noreturn]] void fail(const std::string &what)
-{
-    throw std::system_error(errno, std::generic_category(), what);
-}
-
 void flush(int number, const std::string &name)
 {
     if (::fsync(number) != 0)
-        fail(name);
+        fail_by_errno(name);
 }
 
 // A new name is on the disk once its folder is.
@@ -32,7 +27,7 @@ void flush_folder(const std::filesystem::path &folder)
 {
     const descriptor opened(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (opened.number() < 0)
-        fail(folder.string());
+        fail_by_errno(folder.string());
     flush(opened.number(), folder.string());
 }
 
@@ -41,7 +36,7 @@ void make_folder(const std::filesystem::path &folder)
     if (::mkdir(folder.c_str(), S_IRWXU) == 0)
         flush_folder(folder.parent_path());
     else if (errno != EEXIST)
-        fail(folder.string());
+        fail_by_errno(folder.string());
 }
 
 // A level of folders keeps each of them small.
@@ -57,7 +52,7 @@ std::size_t read_piece(int from, std::array<char, piece_bytes> &piece)
         if (got >= 0)
             return static_cast<std::size_t>(got);
         if (errno != EINTR)
-            fail("read");
+            fail_by_errno("read");
     }
 }
 
@@ -69,7 +64,7 @@ incoming_content::incoming_content(const std::filesystem::path &folder)
       file_(::open(path_.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, S_IRUSR | S_IWUSR))
 {
     if (file_.number() < 0)
-        fail(path_.string());
+        fail_by_errno(path_.string());
 }
 
 incoming_content::~incoming_content()
@@ -96,7 +91,7 @@ void incoming_content::keep(const content_id &finished)
     const std::filesystem::path place = path_of(folder_, finished.hash);
     make_folder(place.parent_path());
     if (::rename(path_.c_str(), place.c_str()) != 0)
-        fail(place.string());
+        fail_by_errno(place.string());
     flush_folder(place.parent_path());
 }
 
@@ -129,7 +124,7 @@ descriptor content_store::open(const content_id &content) const
     const std::filesystem::path path = path_of(directory_, content.hash);
     descriptor opened(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
     if (opened.number() < 0)
-        fail(path.string());
+        fail_by_errno(path.string());
     return opened;
 }
 

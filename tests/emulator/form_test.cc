@@ -10,7 +10,7 @@ using namespace emulator;
 
 namespace {
 
-parameters read(std::string_view form)
+parameters read_form(std::string_view form)
 {
     parameters read;
     add_form_parameters(form, read);
@@ -60,15 +60,15 @@ TEST(FormText, SaysWhatIsWrongWithoutTheValue)
 
 TEST(FormParameters, ReadPairs)
 {
-    EXPECT_EQ(read("a=1&b=x%3Dy&c=&d"),
+    EXPECT_EQ(read_form("a=1&b=x%3Dy&c=&d"),
               (parameters{{"a", "1"}, {"b", "x=y"}, {"c", ""}, {"d", ""}}));
 }
 
 TEST(FormParameters, SplitAPairAtItsFirstEqualsSign)
 {
-    EXPECT_EQ(read("a=b=c"), (parameters{{"a", "b=c"}}));
+    EXPECT_EQ(read_form("a=b=c"), (parameters{{"a", "b=c"}}));
 }
 
-TEST(FormParameters, SkipEmptyPairs) { EXPECT_EQ(read("&a=1&&b=2&"), read("a=1&b=2")); }
+TEST(FormParameters, SkipEmptyPairs) { EXPECT_EQ(read_form("&a=1&&b=2&"), read_form("a=1&b=2")); }
 
-TEST(FormParameters, RefuseANameThatComesTwice) { EXPECT_THROW(read("a=1&%61=1"), refusal); }
+TEST(FormParameters, RefuseANameThatComesTwice) { EXPECT_THROW(read_form("a=1&%61=1"), refusal); }

@@ -33,7 +33,7 @@ constexpr bool is_sanitized = true;
 constexpr bool is_sanitized = false;
 #endif
 
-const std::string status_path = "/api/system/get_status.php";
+const std::string system_status_path = "/api/system/get_status.php";
 
 class Process : public testing::Test {
 protected:
@@ -96,11 +96,12 @@ TEST_F(Process, ServesHttpAndVerifiedHttps)
 {
     const server_process server(data);
 
-    EXPECT_EQ(element(get(server.http_port(), status_path), "database"), "live");
+    EXPECT_EQ(element(get(server.http_port(), system_status_path), "database"), "live");
     for (const char *name : {"localhost", "127.0.0.1"})
-        EXPECT_EQ(element(get_verified(server.https_port(), status_path, server.root(), name),
-                          "database"),
-                  "live");
+        EXPECT_EQ(
+            element(get_verified(server.https_port(), system_status_path, server.root(), name),
+                    "database"),
+            "live");
 }
 
 TEST_F(Process, IsRefusedByAClientThatTrustsAnotherRoot)
@@ -108,10 +109,11 @@ TEST_F(Process, IsRefusedByAClientThatTrustsAnotherRoot)
     const server_process server(data);
     const server_process other(scratch.path() / "other");
 
-    EXPECT_THROW(get_verified(server.https_port(), status_path, other.root(), "localhost"),
+    EXPECT_THROW(get_verified(server.https_port(), system_status_path, other.root(), "localhost"),
                  std::runtime_error);
-    EXPECT_THROW(get_verified(server.https_port(), status_path, server.root(), "example.org"),
-                 std::runtime_error);
+    EXPECT_THROW(
+        get_verified(server.https_port(), system_status_path, server.root(), "example.org"),
+        std::runtime_error);
 }
 
 TEST_F(Process, ListensOnTheLoopbackInterfaceAlone)
@@ -236,7 +238,7 @@ TEST_F(Process, LeavesAFolderThatAnotherServerUses)
 
     EXPECT_EQ(second.exit_code, 1);
     EXPECT_NE(second.errors.find("another quillmere-emulator is using"), std::string::npos);
-    EXPECT_EQ(element(get(server.http_port(), status_path), "database"), "live");
+    EXPECT_EQ(element(get(server.http_port(), system_status_path), "database"), "live");
 }
 
 TEST_F(Process, SaysThatAPortIsTaken)
@@ -255,7 +257,7 @@ TEST_F(Process, StaysSmall)
     if (is_sanitized)
         GTEST_SKIP() << "a sanitizer's own memory is not small";
     const server_process server(data);
-    get_verified(server.https_port(), status_path, server.root(), "localhost");
+    get_verified(server.https_port(), system_status_path, server.root(), "localhost");
 
     const long kilobytes = resident_kilobytes(server.id());
 

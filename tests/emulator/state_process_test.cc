@@ -89,7 +89,7 @@ protected:
     const std::string picture = some_bytes(300'000);
 };
 
-std::string body_of(const std::string &reply) { return reply.substr(reply.find("\r\n\r\n") + 4); }
+std::string body_in(const std::string &reply) { return reply.substr(reply.find("\r\n\r\n") + 4); }
 
 std::string get_range(std::uint16_t port, const std::string &target, const std::string &range)
 {
@@ -109,7 +109,7 @@ TEST_F(StateProcess, ServesWhatWasPreloaded)
     const std::string reply = get(server.http_port(), link_path(server.http_port()));
 
     EXPECT_EQ(reply.rfind("HTTP/1.1 200 OK\r\n", 0), 0u);
-    EXPECT_TRUE(body_of(reply) == picture);
+    EXPECT_TRUE(body_in(reply) == picture);
 }
 
 TEST_F(StateProcess, ServesPartsOverOneConnection)
@@ -128,9 +128,9 @@ TEST_F(StateProcess, ServesPartsOverOneConnection)
 
     EXPECT_EQ(part.rfind("HTTP/1.1 206 Partial Content\r\n", 0), 0u);
     EXPECT_NE(part.find("Content-Range: bytes 100000-199999/300000\r\n"), std::string::npos);
-    EXPECT_TRUE(body_of(part) == picture.substr(100'000, 100'000));
+    EXPECT_TRUE(body_in(part) == picture.substr(100'000, 100'000));
     EXPECT_NE(head.find("Content-Length: 300000\r\n"), std::string::npos);
-    EXPECT_TRUE(body_of(whole) == picture);
+    EXPECT_TRUE(body_in(whole) == picture);
     EXPECT_EQ(element(client.read_reply(), "database"), "live");
 }
 
@@ -142,7 +142,7 @@ TEST_F(StateProcess, ServesBytesOverHttpsWithLinksToItself)
 
     const std::string reply = get_verified(server.https_port(), path, server.root(), "localhost");
 
-    EXPECT_TRUE(body_of(reply) == picture);
+    EXPECT_TRUE(body_in(reply) == picture);
 }
 
 TEST_F(StateProcess, DoesNotRepeatAHostThatIsNone)
@@ -175,7 +175,7 @@ TEST_F(StateProcess, BreaksAReplyWhoseFileIsTooShortRatherThanPadIt)
     const std::string reply = get(server.http_port(), path);
 
     EXPECT_NE(reply.find("Content-Length: 300000\r\n"), std::string::npos);
-    EXPECT_LE(body_of(reply).size(), 1000u);
+    EXPECT_LE(body_in(reply).size(), 1000u);
     EXPECT_EQ(element(get(server.http_port(), "/api/system/get_status.php"), "database"), "live");
 }
 

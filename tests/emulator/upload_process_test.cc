@@ -17,7 +17,7 @@ namespace fs = std::filesystem;
 
 namespace {
 
-std::string hash_of(const std::string &bytes)
+std::string hash_in_hex(const std::string &bytes)
 {
     emulator::sha256_sum sum;
     sum.add(bytes);
@@ -25,7 +25,7 @@ std::string hash_of(const std::string &bytes)
 }
 
 // The service's own form of the digest is base64: this one alone is needed here.
-const std::string abc_digest = "sha-256=:ungWv48Bz+pBQUDeXa4iI7ADYaOWF3qctBD/YfIAFa0=:";
+const std::string hash_of_abc = "sha-256=:ungWv48Bz+pBQUDeXa4iI7ADYaOWF3qctBD/YfIAFa0=:";
 
 class UploadProcess : public testing::Test {
 protected:
@@ -48,7 +48,7 @@ protected:
     std::string post_abc(const std::string &name, const std::string &more = {}) const
     {
         return post("Content-Disposition: attachment; filename=\"" + name + "\"\r\n" +
-                    "Content-Digest: " + abc_digest + "\r\nContent-Length: 3\r\n" + more);
+                    "Content-Digest: " + hash_of_abc + "\r\nContent-Length: 3\r\n" + more);
     }
 
     std::string listing() const
@@ -111,14 +111,14 @@ TEST_F(UploadProcess, GoesOverHttps)
                      server->root(), "localhost");
 
     EXPECT_EQ(element(reply, "result"), "0") << reply;
-    EXPECT_EQ(elements(listing(), "hash"), std::vector<std::string>{hash_of("abc")});
+    EXPECT_EQ(elements(listing(), "hash"), std::vector<std::string>{hash_in_hex("abc")});
 }
 
 TEST_F(UploadProcess, ComesInChunksByteByByte)
 {
     socket_client client(server->http_port());
     const std::string request =
-        post("Content-Disposition: attachment; filename=a.txt\r\nRepr-Digest: " + abc_digest +
+        post("Content-Disposition: attachment; filename=a.txt\r\nRepr-Digest: " + hash_of_abc +
              "\r\nTransfer-Encoding: chunked\r\n") +
         "1\r\na\r\n2\r\nbc\r\n0\r\n\r\n";
 
@@ -126,7 +126,7 @@ TEST_F(UploadProcess, ComesInChunksByteByByte)
         client.send(std::string(1, byte));
 
     EXPECT_EQ(element(client.read_reply(), "result"), "0");
-    EXPECT_EQ(elements(listing(), "hash"), std::vector<std::string>{hash_of("abc")});
+    EXPECT_EQ(elements(listing(), "hash"), std::vector<std::string>{hash_in_hex("abc")});
 }
 
 TEST_F(UploadProcess, LargerThanAnyOtherBodyMayBeARevision)
@@ -141,12 +141,12 @@ TEST_F(UploadProcess, LargerThanAnyOtherBodyMayBeARevision)
     const std::string bytes(3'000'000, 'x');
 
     client.send(post("Content-Length: 3000000\r\n", "&quickkey=" + key + "&revision=" + revision +
-                                                        "&target_hash=" + hash_of(bytes) +
+                                                        "&target_hash=" + hash_in_hex(bytes) +
                                                         "&target_size=3000000") +
                 bytes);
 
     EXPECT_EQ(element(client.read_reply(), "key"), key);
-    EXPECT_EQ(elements(listing(), "hash"), std::vector<std::string>{hash_of(bytes)});
+    EXPECT_EQ(elements(listing(), "hash"), std::vector<std::string>{hash_in_hex(bytes)});
 }
 
 TEST_F(UploadProcess, ThatIsRefusedIsNotInvited)

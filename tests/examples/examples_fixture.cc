@@ -6,7 +6,7 @@ namespace quillmere_test {
 
 namespace {
 
-constexpr const char *upload_path = "/api/upload/upload.php?type=desktop";
+constexpr const char *desktop_upload_path = "/api/upload/upload.php?type=desktop";
 
 nlohmann::json stored_root(const emulated_service &service)
 {
@@ -22,7 +22,7 @@ variables example_environment(const std::string &service, const std::string &upl
                               const std::string &root_path)
 {
     return {{"QUILLMERE_SERVICE", service},
-            {"QUILLMERE_UPLOADS", uploads + upload_path},
+            {"QUILLMERE_UPLOADS", uploads + desktop_upload_path},
             {"QUILLMERE_CA_FILE", root_path},
             {"QUILLMERE_EMAIL", account_email},
             {"QUILLMERE_PASSWORD", account_password}};

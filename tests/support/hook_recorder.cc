@@ -8,7 +8,7 @@ namespace {
 std::mutex mutex;
 std::vector<hook_call> recorded;
 
-std::optional<std::string> copy_of(const char *text)
+std::optional<std::string> owned_copy_of(const char *text)
 {
     return text ? std::optional<std::string>(text) : std::nullopt;
 }
@@ -18,7 +18,8 @@ static int32_t record_call(const char *url, const char *response, int32_t status
                            const char *message)
 {
     std::lock_guard<std::mutex> lock(mutex);
-    recorded.push_back({copy_of(url), copy_of(response), status, copy_of(message)});
+    recorded.push_back(
+        {owned_copy_of(url), owned_copy_of(response), status, owned_copy_of(message)});
     return 0;
 }
 }

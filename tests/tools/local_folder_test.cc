@@ -16,8 +16,8 @@ namespace {
 namespace fs = std::filesystem;
 using namespace quillmere::tools;
 
-const expected_content abc = {3,
-                              "ba7816bf8f01cfea414140de5dae2223b00361a396177a9cb410ff61f20015ad"};
+const expected_content abc_content = {
+    3, "ba7816bf8f01cfea414140de5dae2223b00361a396177a9cb410ff61f20015ad"};
 
 class LocalFolder : public testing::Test {
 protected:
@@ -25,7 +25,7 @@ protected:
     const std::string path = outside.path_of("inside");
     const bool made = fs::create_directory(path);
     const local_folder folder{path};
-    const std::string partial = path + "/" + partial_file::name_for(abc);
+    const std::string partial = path + "/" + partial_file::name_for(abc_content);
 };
 
 } // namespace
@@ -66,15 +66,15 @@ TEST_F(LocalFolder, KnowsAFileByItsBytes)
     outside.write("inside/longer", "abcd");
     fs::create_symlink(path + "/same", path + "/link");
 
-    EXPECT_TRUE(folder.has("same", abc));
+    EXPECT_TRUE(folder.has("same", abc_content));
     for (const char *name : {"other", "longer", "link", "missing"})
-        EXPECT_FALSE(folder.has(name, abc)) << name;
+        EXPECT_FALSE(folder.has(name, abc_content)) << name;
 }
 
 TEST_F(LocalFolder, GetsAFileWhenItIsWhole)
 {
     {
-        partial_file file(folder.number(), abc);
+        partial_file file(folder.number(), abc_content);
         file.append("ab");
         file.append("c");
         EXPECT_FALSE(fs::exists(path + "/name"));
@@ -89,11 +89,11 @@ TEST_F(LocalFolder, GetsAFileWhenItIsWhole)
 TEST_F(LocalFolder, KeepsTheBeginningOfAFile)
 {
     {
-        partial_file file(folder.number(), abc);
+        partial_file file(folder.number(), abc_content);
         file.append("ab");
     }
 
-    partial_file again(folder.number(), abc);
+    partial_file again(folder.number(), abc_content);
 
     EXPECT_EQ(again.size(), 2u);
     EXPECT_EQ(again.missing(), 1u);
@@ -104,7 +104,7 @@ TEST_F(LocalFolder, KeepsTheBeginningOfAFile)
 TEST_F(LocalFolder, KeepsNothingOfNothing)
 {
     {
-        partial_file file(folder.number(), abc);
+        partial_file file(folder.number(), abc_content);
         EXPECT_TRUE(fs::exists(partial));
     }
 
@@ -113,16 +113,16 @@ TEST_F(LocalFolder, KeepsNothingOfNothing)
 
 TEST_F(LocalFolder, DropsABeginningThatIsTooLong)
 {
-    outside.write("inside/" + partial_file::name_for(abc), "longer than it");
+    outside.write("inside/" + partial_file::name_for(abc_content), "longer than it");
 
-    const partial_file file(folder.number(), abc);
+    const partial_file file(folder.number(), abc_content);
 
     EXPECT_EQ(file.size(), 0u);
 }
 
 TEST_F(LocalFolder, IsRightWithTheRightBytesAlone)
 {
-    partial_file file(folder.number(), abc);
+    partial_file file(folder.number(), abc_content);
     file.append("abd");
     EXPECT_FALSE(file.is_right());
     file.restart();
@@ -136,19 +136,19 @@ TEST_F(LocalFolder, IsRightWithTheRightBytesAlone)
 TEST_F(LocalFolder, TakesNoLinkAndNoPipeForABeginning)
 {
     fs::create_symlink(outside.path_of("elsewhere"), partial);
-    EXPECT_THROW(partial_file(folder.number(), abc), failure);
+    EXPECT_THROW(partial_file(folder.number(), abc_content), failure);
     EXPECT_FALSE(fs::exists(outside.path_of("elsewhere")));
 
     fs::remove(partial);
     ASSERT_EQ(::mkfifo(partial.c_str(), 0600), 0);
-    EXPECT_THROW(partial_file(folder.number(), abc), failure);
+    EXPECT_THROW(partial_file(folder.number(), abc_content), failure);
 }
 
 TEST_F(LocalFolder, HasEachBeginningWorkedOnOnce)
 {
-    const partial_file first(folder.number(), abc);
+    const partial_file first(folder.number(), abc_content);
 
-    EXPECT_THROW(partial_file(folder.number(), abc), failure);
+    EXPECT_THROW(partial_file(folder.number(), abc_content), failure);
 }
 
 } // namespace quillmere_test

@@ -22,7 +22,7 @@ using testing::Not;
 const std::string limits_reply =
     xml_reply("<response><result>Success</result><max_keys>500</max_keys>"
               "<folder_depth_limit>deep</folder_depth_limit></response>");
-const std::string refusal =
+const std::string wrong_credentials =
     http_reply(403, "<response><result>Error</result><error>107</error>"
                     "<message>The credentials are wrong</message></response>");
 
@@ -122,7 +122,7 @@ TEST_F(CommandLine, MasksTheTokenThatItSends)
 
 TEST_F(CommandLine, TellsWhatTheServiceRefused)
 {
-    server.answer(refusal);
+    server.answer(wrong_credentials);
 
     const outcome ended = home.run({"login", "someone@example.org", "--password-stdin"}, "wrong");
 
@@ -135,7 +135,7 @@ TEST_F(CommandLine, TellsWhatTheServiceRefused)
 
 TEST_F(CommandLine, TellsErrorsInJsonToo)
 {
-    server.answer(refusal);
+    server.answer(wrong_credentials);
 
     const outcome ended = home.run({"--json", "limits"});
 

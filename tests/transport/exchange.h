@@ -14,6 +14,9 @@
 
 namespace quillmere_test {
 
+constexpr const char *path = "/a/path/of/some/length"; // to ask for where it does not matter
+constexpr const char *success = "<response><result>Success</result></response>";
+
 struct exchange {
     int64_t code;
     std::optional<std::string> body; // without a value where the response text was NULL

@@ -11,8 +11,6 @@ namespace {
 
 using testing::MatchesRegex;
 
-constexpr const char *path = "/a/path/of/some/length";
-
 class FailedTransfer : public library_test {
 protected:
     std::string url() const { return plain_server.base_url() + path; }

@@ -23,8 +23,6 @@ namespace {
 using quillmere::shares_openssl_with_libcurl;
 using testing::MatchesRegex;
 
-constexpr const char *path = "/a/path/of/some/length";
-
 // The time of the last change to a file.
 std::time_t changed(const std::string &file)
 {

@@ -15,7 +15,6 @@ namespace {
 
 using testing::MatchesRegex;
 
-constexpr const char *path = "/a/path/of/some/length";
 const std::string reply = "HTTP/1.1 200 OK\r\nContent-Length: 4\r\n\r\nkept";
 
 void answer(connection &client)

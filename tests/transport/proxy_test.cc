@@ -8,8 +8,6 @@ namespace {
 
 using testing::MatchesRegex;
 
-constexpr const char *path = "/a/path/of/some/length";
-
 class Proxy : public library_test {
 protected:
     void describe_proxy(const char *user, const char *password)

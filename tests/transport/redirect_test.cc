@@ -8,8 +8,6 @@ namespace {
 
 using testing::MatchesRegex;
 
-constexpr const char *path = "/a/path/of/some/length";
-
 std::string redirect_to(const std::string &location, int status = 302)
 {
     return http_reply(status, "moved", {"Location: " + location});

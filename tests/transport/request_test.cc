@@ -113,8 +113,6 @@ protected:
     owned_request request{api_request_new()};
 };
 
-constexpr const char *success = "<response><result>Success</result></response>";
-
 TEST_F(ApiCall, SucceedsWithOneGetOfItsUrl)
 {
     called result = call_answered_by(xml_reply(success));

@@ -8,8 +8,6 @@ namespace {
 
 using testing::MatchesRegex;
 
-constexpr const char *path = "/a/path/of/some/length";
-
 struct bad_certificate {
     const char *fault;
     certificate (*make)();

@@ -7,7 +7,6 @@ namespace {
 
 using testing::MatchesRegex;
 
-constexpr const char *success = "<response><result>Success</result></response>";
 constexpr const char *every = "a-b_c.d~e(x)*!^\xc3\xa9&=%+ /";
 constexpr const char *every_encoded = "a%2db%5fc%2ed%7ee(x)*!^%c3%a9%26%3d%25%2b%20%2f";
 

@@ -9,8 +9,6 @@ namespace quillmere::tools {
 
 namespace {
 
-constexpr field_value number = field_value::number;
-
 // The storage figures stand among the limits, too; people need to see them once.
 constexpr record_field<user_info> user_fields[] = {
     {"email", "E-mail", user_info_get_email},
@@ -26,13 +24,14 @@ constexpr record_field<user_info> user_fields[] = {
     {"validated", "Validated", user_info_get_validated},
     {"tos_accepted", "Terms accepted", user_info_get_tos_accepted},
     {"options", "Options", user_info_get_options},
-    {"bandwidth", "Bandwidth left", user_info_get_bandwidth, number},
-    {"max_upload_size", "Largest upload", user_info_get_max_upload, number},
-    {"max_instant_upload_size", "Largest instant upload", user_info_get_max_instant_upload, number},
-    {"base_storage", nullptr, user_info_get_base_storage, number},
-    {"bonus_storage", nullptr, user_info_get_bonus_storage, number},
-    {"storage_limit", nullptr, user_info_get_storage_limit, number},
-    {"used_storage_size", nullptr, user_info_get_used_storage, number},
+    {"bandwidth", "Bandwidth left", user_info_get_bandwidth, field_value::number},
+    {"max_upload_size", "Largest upload", user_info_get_max_upload, field_value::number},
+    {"max_instant_upload_size", "Largest instant upload", user_info_get_max_instant_upload,
+     field_value::number},
+    {"base_storage", nullptr, user_info_get_base_storage, field_value::number},
+    {"bonus_storage", nullptr, user_info_get_bonus_storage, field_value::number},
+    {"storage_limit", nullptr, user_info_get_storage_limit, field_value::number},
+    {"used_storage_size", nullptr, user_info_get_used_storage, field_value::number},
     {"storage_limit_exceeded", "Storage exceeded", user_info_get_storage_limit_exceeded},
 };
 
@@ -60,24 +59,27 @@ constexpr record_field<user_info> twitter_fields[] = {
     {"i18n", "Twitter language", user_info_get_tw_i18n},
 };
 
-constexpr record_field<user_limits> limit_fields[] = {
-    {"storage_base", "Storage, base", user_limits_get_storage_base, number},
-    {"storage_bonus", "Storage, bonus", user_limits_get_storage_bonus, number},
-    {"storage_limit", "Storage limit", user_limits_get_storage_limit, number},
-    {"storage_used", "Storage used", user_limits_get_storage_used, number},
-    {"bandwidth_limit", "Bandwidth limit", user_limits_get_bandwidth_limit, number},
-    {"bandwidth_used", "Bandwidth used", user_limits_get_bandwidth_used, number},
-    {"collaboration_limit", "Shares a day", user_limits_get_collaboration_limit, number},
-    {"collaboration_today", "Shares today", user_limits_get_collaboration_today, number},
+constexpr record_field<user_limits> account_limit_fields[] = {
+    {"storage_base", "Storage, base", user_limits_get_storage_base, field_value::number},
+    {"storage_bonus", "Storage, bonus", user_limits_get_storage_bonus, field_value::number},
+    {"storage_limit", "Storage limit", user_limits_get_storage_limit, field_value::number},
+    {"storage_used", "Storage used", user_limits_get_storage_used, field_value::number},
+    {"bandwidth_limit", "Bandwidth limit", user_limits_get_bandwidth_limit, field_value::number},
+    {"bandwidth_used", "Bandwidth used", user_limits_get_bandwidth_used, field_value::number},
+    {"collaboration_limit", "Shares a day", user_limits_get_collaboration_limit,
+     field_value::number},
+    {"collaboration_today", "Shares today", user_limits_get_collaboration_today,
+     field_value::number},
     {"one_time_downloads_limit", "One-time downloads a day",
-     user_limits_get_one_time_downloads_limit, number},
+     user_limits_get_one_time_downloads_limit, field_value::number},
     {"one_time_downloads_today", "One-time downloads today",
-     user_limits_get_one_time_downloads_today, number},
+     user_limits_get_one_time_downloads_today, field_value::number},
     {"streaming_bandwidth_limit", "Streaming a day", user_limits_get_streaming_bandwidth_limit,
-     number},
+     field_value::number},
     {"streaming_bandwidth_today", "Streaming today", user_limits_get_streaming_bandwidth_today,
-     number},
-    {"upload_size_limit", "Upload size limit", user_limits_get_upload_size_limit, number},
+     field_value::number},
+    {"upload_size_limit", "Upload size limit", user_limits_get_upload_size_limit,
+     field_value::number},
 };
 
 user_info_owner read_user(const account &owner)
@@ -121,7 +123,7 @@ void run_whoami(command_context &context)
     context.output.groups({{"user", facts_of(user.get(), user_fields)},
                            {"facebook", facts_of(user.get(), facebook_fields)},
                            {"twitter", facts_of(user.get(), twitter_fields)},
-                           {"limits", facts_of(limits.get(), limit_fields)},
+                           {"limits", facts_of(limits.get(), account_limit_fields)},
                            {"tree", read_revision(owner)}});
 }
 

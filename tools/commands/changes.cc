@@ -34,7 +34,7 @@ constexpr record_field<change_info> text_fields[] = {
     {"filetype", nullptr, change_info_get_filetype},
 };
 
-std::vector<fact> facts_of(const change_info *record)
+std::vector<fact> facts_of_change(const change_info *record)
 {
     const bool deleted = change_info_get_changetype(record) == 0;
     const bool folder = change_info_get_is_folder(record) != 0;
@@ -50,7 +50,7 @@ std::vector<fact> facts_of(const change_info *record)
 void add_block(const change_block &read, feed &whole)
 {
     for (const change_info *each : in_order_sent(read.changes.get()))
-        whole.changes.rows.push_back(facts_of(each));
+        whole.changes.rows.push_back(facts_of_change(each));
     whole.block_size = read.size;
 }
 

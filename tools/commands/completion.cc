@@ -37,7 +37,7 @@ struct typed_path {
     std::string name;
 };
 
-typed_path split(const std::string &word)
+typed_path split_typed(const std::string &word)
 {
     const std::size_t slash = word.rfind('/');
     if (slash == std::string::npos)
@@ -54,7 +54,7 @@ bool may_be_offered(const std::string &word)
 
 std::vector<std::string> remote_words(command_context &context)
 {
-    const typed_path typed = split(context.given.complete.prefix);
+    const typed_path typed = split_typed(context.given.complete.prefix);
     const account owner = signed_in_account(context);
     const remote_tree tree = tree_of(owner);
     const remote_entry folder = find_folder(tree, typed.folder.empty() ? "/" : typed.folder);

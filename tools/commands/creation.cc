@@ -25,7 +25,7 @@ void declare_time(CLI::App &options, arguments &given)
         ->option_text("TIME");
 }
 
-std::vector<fact> facts_of(const remote_entry &entry, const std::string &path, bool created)
+std::vector<fact> facts_of_created(const remote_entry &entry, const std::string &path, bool created)
 {
     return {{"kind", "Kind", word_for(entry.kind)},
             {"key", "Key", entry.key},
@@ -89,13 +89,13 @@ void run_mkdir(command_context &context)
     const remote_place place = follow_path(tree_of(owner), given.path);
     if (given.parents && place.exists() && place.reached.is_folder()) {
         context.output.sentence("There is " + given.path + " already",
-                                facts_of(place.reached, given.path, false));
+                                facts_of_created(place.reached, given.path, false));
         return;
     }
     if (!given.parents || place.exists())
         folder_for_new(place, given.path);
     const remote_entry made = create_all(owner, place, given.time);
-    context.output.sentence("Created " + given.path, facts_of(made, given.path, true));
+    context.output.sentence("Created " + given.path, facts_of_created(made, given.path, true));
 }
 
 void run_create(command_context &context)
@@ -108,7 +108,7 @@ void run_create(command_context &context)
         throw failure(exit_code::usage, given.path + " ends in a slash, which no file does",
                       "leave the slash out, or use mkdir for a folder");
     const remote_entry made = create_file_in(owner, folder, place.missing.front(), given.time);
-    context.output.sentence("Created " + given.path, facts_of(made, given.path, true));
+    context.output.sentence("Created " + given.path, facts_of_created(made, given.path, true));
 }
 
 void run_rm(command_context &context)

@@ -13,7 +13,7 @@ namespace quillmere::tools {
 namespace {
 
 constexpr std::size_t result_columns = 9; // "skipped" and two blanks
-constexpr std::size_t name_columns = 10;
+constexpr std::size_t step_name_columns = 10;
 constexpr std::size_t time_columns = 9; // "12345.6 ms" would stick out, as it should
 
 double milliseconds_of(std::chrono::microseconds time)
@@ -56,19 +56,14 @@ std::string line_for(const examined_step &step, text_style style)
     const std::string shown =
         style == text_style::colored ? painted(word, paint_for(step.result)) : word;
     std::string line = shown + blanks_behind(word, result_columns) + name +
-                       blanks_behind(name, name_columns) + blanks_behind(time, time_columns) +
+                       blanks_behind(name, step_name_columns) + blanks_behind(time, time_columns) +
                        time + "  " + escape_controls(step.detail);
     if (!step.advice.empty())
         line += " (" + escape_controls(step.advice) + ")";
     return line + "\n";
 }
 
-nlohmann::ordered_json text_or_nothing(const std::string &text)
-{
-    return text.empty() ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
-}
-
-std::vector<fact> facts_of(const examined_step &step)
+std::vector<fact> facts_of_step(const examined_step &step)
 {
     nlohmann::ordered_json time = nullptr;
     if (step.time)
@@ -77,7 +72,7 @@ std::vector<fact> facts_of(const examined_step &step)
             {"result", nullptr, word_for(step.result)},
             {"milliseconds", nullptr, time},
             {"detail", nullptr, step.detail},
-            {"advice", nullptr, text_or_nothing(step.advice)}};
+            {"advice", nullptr, text_unless_empty(step.advice)}};
 }
 
 void tell(const examination &steps, bool healthy, results &output)
@@ -85,7 +80,7 @@ void tell(const examination &steps, bool healthy, results &output)
     if (output.format() == result_format::json) {
         result_table table = {"steps", {}, {}};
         for (const examined_step &each : steps)
-            table.rows.push_back(facts_of(each));
+            table.rows.push_back(facts_of_step(each));
         return output.rows({{"healthy", nullptr, healthy}}, table);
     }
     std::string text;

@@ -19,7 +19,7 @@ struct get_words {
     std::string destination = ".";
 };
 
-get_words words_of(const get_arguments &given)
+get_words split_words(const get_arguments &given)
 {
     get_words words = {given.words, "."};
     if (words.sources.size() > 1) {
@@ -122,7 +122,7 @@ void declare_get(CLI::App &options, arguments &given)
 
 void run_get(command_context &context)
 {
-    const get_words words = words_of(context.given.get);
+    const get_words words = split_words(context.given.get);
     const local_destination to = choose_destination(words);
     const account owner = signed_in_account(context);
     get_command command(context, owner, words);

@@ -19,7 +19,7 @@ struct put_words {
     std::string destination = "/";
 };
 
-put_words words_of(const put_arguments &given)
+put_words split_sources(const put_arguments &given)
 {
     put_words words = {given.words, "/"};
     if (words.sources.size() > 1) {
@@ -42,17 +42,17 @@ void check(const put_words &words, bool recursive)
 }
 
 /** Where the sources go: into a folder under their names, or to a name of their own. */
-struct destination {
+struct put_destination {
     remote_place place;
     std::string path;
 
     bool is_folder() const { return place.exists() && place.reached.is_folder(); }
 };
 
-destination choose_destination(const account &owner, const put_words &words)
+put_destination choose_destination(const account &owner, const put_words &words)
 {
     const std::string &path = words.destination;
-    destination chosen = {follow_path(tree_of(owner), path), path};
+    put_destination chosen = {follow_path(tree_of(owner), path), path};
     if (chosen.is_folder())
         return chosen;
     const bool folder_alone = words.sources.size() == 1 && is_local_folder(words.sources.front());
@@ -83,7 +83,7 @@ public:
     {
     }
 
-    void put(const std::string &source, const destination &to)
+    void put(const std::string &source, const put_destination &to)
     {
         if (to.place.exists() && !to.is_folder()) {
             const remote_file target =
@@ -172,12 +172,12 @@ void declare_update(CLI::App &options, arguments &given)
 void run_put(command_context &context)
 {
     const put_arguments &given = context.given.put;
-    const put_words words = words_of(given);
+    const put_words words = split_sources(given);
     check(words, given.recursive);
     const account owner = signed_in_account(context);
     put_command command(context, owner,
                         given.recursive || words.sources.size() > 1 ? batch::many : batch::one);
-    const destination to = choose_destination(owner, words);
+    const put_destination to = choose_destination(owner, words);
     for (const std::string &source : words.sources)
         command.put(source, to);
     command.tell(context.output);

@@ -9,21 +9,24 @@ namespace quillmere::tools {
 
 namespace {
 
-constexpr field_value number = field_value::number;
-
 constexpr record_field<system_limits> limit_fields[] = {
-    {"max_objects", "Objects", system_limits_get_max_objects, number},
-    {"max_keys", "Keys", system_limits_get_max_keys, number},
-    {"max_image_size", "Image size", system_limits_get_max_image_size, number},
-    {"zip_max_filesize", "Archived file size", system_limits_get_zip_max_filesize, number},
-    {"zip_max_total_filesize", "Archive size", system_limits_get_zip_max_total_filesize, number},
+    {"max_objects", "Objects", system_limits_get_max_objects, field_value::number},
+    {"max_keys", "Keys", system_limits_get_max_keys, field_value::number},
+    {"max_image_size", "Image size", system_limits_get_max_image_size, field_value::number},
+    {"zip_max_filesize", "Archived file size", system_limits_get_zip_max_filesize,
+     field_value::number},
+    {"zip_max_total_filesize", "Archive size", system_limits_get_zip_max_total_filesize,
+     field_value::number},
     {"folder_content_chunk_size", "Folder content chunk",
-     system_limits_get_folder_content_chunk_size, number},
-    {"folder_depth_limit", "Folder depth", system_limits_get_folder_depth_limit, number},
-    {"limit_search_results", "Search results", system_limits_get_limit_search_results, number},
-    {"daily_shares_limit", "Shares per day", system_limits_get_daily_shares_limit, number},
+     system_limits_get_folder_content_chunk_size, field_value::number},
+    {"folder_depth_limit", "Folder depth", system_limits_get_folder_depth_limit,
+     field_value::number},
+    {"limit_search_results", "Search results", system_limits_get_limit_search_results,
+     field_value::number},
+    {"daily_shares_limit", "Shares per day", system_limits_get_daily_shares_limit,
+     field_value::number},
     {"device_changes_list_limit", "Device change list", system_limits_get_device_changes_list_limit,
-     number},
+     field_value::number},
 };
 
 constexpr record_field<system_status> status_fields[] = {

@@ -13,15 +13,15 @@ namespace quillmere::tools {
 namespace {
 
 /** Where an entry goes. */
-struct destination {
+struct new_place {
     remote_entry folder;
     std::string name;
     std::string path;
 };
 
 // As everywhere: into what is a folder already, otherwise to a new name.
-destination choose_destination(const remote_tree &tree, const remote_entry &source,
-                               const std::string &path)
+new_place choose_destination(const remote_tree &tree, const remote_entry &source,
+                             const std::string &path)
 {
     const remote_place place = follow_path(tree, path);
     if (place.exists()) {
@@ -76,7 +76,7 @@ void run_mv(command_context &context)
     const account owner = signed_in_account(context);
     const remote_tree tree = tree_of(owner);
     const remote_entry source = find_movable(tree, given.source, "moved");
-    const destination to = choose_destination(tree, source, given.destination);
+    const new_place to = choose_destination(tree, source, given.destination);
     const bool same_folder = to.folder.key == source.parent_key;
     if (same_folder && to.name == source.name)
         throw failure(exit_code::refused, "there is " + to.path + " already",
@@ -100,7 +100,7 @@ void run_cp(command_context &context)
     if (source.is_folder() && !given.recursive)
         throw failure(exit_code::usage, given.source + " is a folder",
                       "use --recursive to copy it with all that it holds");
-    const destination to = choose_destination(tree, source, given.destination);
+    const new_place to = choose_destination(tree, source, given.destination);
     const remote_entry copy = copy_into(owner, source, to.folder);
     if (to.name != source.name)
         after("copied " + given.source + " under its old name",

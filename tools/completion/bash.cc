@@ -5,7 +5,7 @@ namespace quillmere::tools {
 namespace {
 
 // Everything but the tables, which stand before it.
-constexpr const char *machinery = R"bash(
+constexpr const char *bash_machinery = R"bash(
 # The words up to the cursor as they were typed: bash takes them apart at ":" and "=", too.
 _quillmere_split()
 {
@@ -161,7 +161,7 @@ std::string options_function(const program_shape &program)
     return "\n_quillmere_options_of()\n{\n    case $command in\n" + cases + "    esac\n}\n";
 }
 
-std::string operand_function(const program_shape &program)
+std::string bash_operands(const program_shape &program)
 {
     std::string cases;
     for (const command_shape &each : program.commands) {
@@ -194,8 +194,8 @@ std::string bash_completion(const program_shape &program)
            assignment("_quillmere_values", names_with_value(program)) +
            assignment("_quillmere_account_values", account_options(program, true)) +
            assignment("_quillmere_account_flags", account_options(program, false)) +
-           options_function(program) + value_function(program) + operand_function(program) +
-           machinery;
+           options_function(program) + value_function(program) + bash_operands(program) +
+           bash_machinery;
 }
 
 } // namespace quillmere::tools

@@ -4,7 +4,7 @@ namespace quillmere::tools {
 
 namespace {
 
-constexpr const char *machinery = R"fish(
+constexpr const char *fish_machinery = R"fish(
 # The command on the line, if there is one yet.
 function __quillmere_command
     set -l skipped no
@@ -50,7 +50,7 @@ end
 complete -c quillmere -f
 )fish";
 
-std::string in_quotes(const std::string &text)
+std::string in_fish_quotes(const std::string &text)
 {
     std::string safe;
     for (const char each : text) {
@@ -61,7 +61,7 @@ std::string in_quotes(const std::string &text)
     return "'" + safe + "'";
 }
 
-std::string array_of(const std::string &name, const std::vector<std::string> &words)
+std::string fish_array(const std::string &name, const std::vector<std::string> &words)
 {
     return "set -g " + name + " " + joined(words, " ") + "\n";
 }
@@ -79,7 +79,7 @@ std::string value_of(const option_shape &option)
     case value_kind::profile:
         return " -x -a '(__quillmere_ask profile)'";
     case value_kind::choice:
-        return " -x -a " + in_quotes(joined(option.choices, " "));
+        return " -x -a " + in_fish_quotes(joined(option.choices, " "));
     }
     return "";
 }
@@ -89,14 +89,14 @@ std::string option_line(const option_shape &option, const std::string &condition
     std::string line = "complete -c quillmere" + condition;
     for (const std::string &name : option.names)
         line += name.substr(0, 2) == "--" ? " -l " + name.substr(2) : " -s " + name.substr(1);
-    return line + value_of(option) + " -d " + in_quotes(option.summary) + "\n";
+    return line + value_of(option) + " -d " + in_fish_quotes(option.summary) + "\n";
 }
 
 std::string operand_line(const command_shape &command, const std::string &condition)
 {
     const std::string beginning = "complete -c quillmere" + condition;
     if (!command.operand_choices.empty())
-        return beginning + " -a " + in_quotes(joined(command.operand_choices, " ")) + "\n";
+        return beginning + " -a " + in_fish_quotes(joined(command.operand_choices, " ")) + "\n";
     switch (command.operands) {
     case operand_kind::remote:
         return beginning + " -a '(__quillmere_ask remote)'\n";
@@ -112,7 +112,7 @@ std::string lines_for(const command_shape &command)
 {
     const std::string condition = " -n '__quillmere_is " + command.name + "'";
     std::string lines = "complete -c quillmere -n '__quillmere_is \"\"' -a " + command.name +
-                        " -d " + in_quotes(command.summary) + "\n";
+                        " -d " + in_fish_quotes(command.summary) + "\n";
     for (const option_shape &each : command.options)
         lines += option_line(each, condition);
     return lines + operand_line(command, condition);
@@ -124,10 +124,10 @@ std::string fish_completion(const program_shape &program)
 {
     std::string script =
         "# Completion of quillmere in fish, made by: quillmere completion fish\n\n";
-    script += array_of("__quillmere_values", names_with_value(program));
-    script += array_of("__quillmere_account_values", account_options(program, true));
-    script += array_of("__quillmere_account_flags", account_options(program, false));
-    script += machinery;
+    script += fish_array("__quillmere_values", names_with_value(program));
+    script += fish_array("__quillmere_account_values", account_options(program, true));
+    script += fish_array("__quillmere_account_flags", account_options(program, false));
+    script += fish_machinery;
     for (const option_shape &each : program.options)
         script += option_line(each, "");
     for (const command_shape &each : program.commands)

@@ -4,7 +4,7 @@ namespace quillmere::tools {
 
 namespace {
 
-constexpr const char *machinery = R"zsh(
+constexpr const char *zsh_machinery = R"zsh(
 # What is in the account, or the profiles there are; words are asked for as if they were not quoted.
 _quillmere_ask()
 {
@@ -49,7 +49,7 @@ else
 fi
 )zsh";
 
-std::string in_quotes(const std::string &text)
+std::string in_zsh_quotes(const std::string &text)
 {
     std::string safe;
     for (const char each : text)
@@ -97,7 +97,7 @@ std::string specifications_of(const std::vector<option_shape> &options, const st
             text += "[" + escaped(option.summary, "[]\\") + "]";
             if (takes_value)
                 text += ":value:" + action_of(option.value, option.choices);
-            lines += indent + in_quotes(text) + "\n";
+            lines += indent + in_zsh_quotes(text) + "\n";
         }
     }
     return lines;
@@ -106,19 +106,19 @@ std::string specifications_of(const std::vector<option_shape> &options, const st
 std::string operands_of(const command_shape &command)
 {
     if (!command.operand_choices.empty())
-        return in_quotes("1:word:(" + joined(command.operand_choices, " ") + ")");
+        return in_zsh_quotes("1:word:(" + joined(command.operand_choices, " ") + ")");
     switch (command.operands) {
     case operand_kind::remote:
-        return in_quotes("*:path:_quillmere_remote");
+        return in_zsh_quotes("*:path:_quillmere_remote");
     case operand_kind::local_and_remote:
-        return in_quotes("*:path:_quillmere_both");
+        return in_zsh_quotes("*:path:_quillmere_both");
     case operand_kind::none:
         break;
     }
     return {};
 }
 
-std::string array_of(const std::string &name, const std::vector<std::string> &words)
+std::string zsh_array(const std::string &name, const std::vector<std::string> &words)
 {
     return name + "=(" + joined(words, " ") + ")\n";
 }
@@ -127,11 +127,11 @@ std::string commands_array(const program_shape &program)
 {
     std::string lines = "_quillmere_commands=(\n";
     for (const command_shape &each : program.commands)
-        lines += "    " + in_quotes(escaped(each.name, ":") + ":" + each.summary) + "\n";
+        lines += "    " + in_zsh_quotes(escaped(each.name, ":") + ":" + each.summary) + "\n";
     return lines + ")\n";
 }
 
-std::string operand_function(const program_shape &program)
+std::string zsh_operands(const program_shape &program)
 {
     std::string text = "\n_quillmere_operand()\n{\n    case $words[1] in\n";
     for (const command_shape &each : program.commands) {
@@ -160,9 +160,9 @@ std::string zsh_completion(const program_shape &program)
            "typeset -ga _quillmere_account_values _quillmere_account_flags\n" +
            commands_array(program) + "_quillmere_options=(\n" +
            specifications_of(program.options, "    ") + ")\n" +
-           array_of("_quillmere_account_values", account_options(program, true)) +
-           array_of("_quillmere_account_flags", account_options(program, false)) +
-           operand_function(program) + machinery;
+           zsh_array("_quillmere_account_values", account_options(program, true)) +
+           zsh_array("_quillmere_account_flags", account_options(program, false)) +
+           zsh_operands(program) + zsh_machinery;
 }
 
 } // namespace quillmere::tools

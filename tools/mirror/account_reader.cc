@@ -3,6 +3,7 @@
 #include <utility>
 
 #include "../change_feed.h"
+#include "../text.h"
 #include "../transfers/remote_file.h"
 
 namespace quillmere::tools {
@@ -17,8 +18,6 @@ constexpr int rounds_of_news = 4;
 constexpr int listings_of_a_folder = 5;
 constexpr std::size_t steps_between_keeping = 200;
 
-std::string text_of(const char *text) { return text == nullptr ? "" : text; }
-
 std::string checked_key(const char *key)
 {
     if (key == nullptr || !is_key(key))
@@ -31,7 +30,7 @@ entry_change change_of(const change_info *record)
     const bool folder = change_info_get_is_folder(record) != 0;
     return {checked_key(change_info_get_key(record)),
             folder ? entry_kind::folder : entry_kind::file, change_info_get_changetype(record) == 0,
-            text_of(change_info_get_parent_folderkey(record))};
+            text_or_empty(change_info_get_parent_folderkey(record))};
 }
 
 // An entry that never got content is an empty file.
@@ -43,18 +42,18 @@ expected_content content_of(const file_info *record)
     return {0, hex_of(sha256_sum().finish())};
 }
 
-known_entry entry_of(const folder_info *record)
+known_entry known_entry_of(const folder_info *record)
 {
     known_entry entry;
-    entry.name = text_of(folder_info_get_foldername(record));
+    entry.name = text_or_empty(folder_info_get_foldername(record));
     return entry;
 }
 
-known_entry entry_of(const file_info *record)
+known_entry known_entry_of(const file_info *record)
 {
     known_entry entry;
     entry.kind = entry_kind::file;
-    entry.name = text_of(file_info_get_filename(record));
+    entry.name = text_or_empty(file_info_get_filename(record));
     entry.content = content_of(record);
     return entry;
 }
@@ -179,8 +178,9 @@ void account_reader::finish(known_account &known, const std::string &key)
 
 void account_reader::describe(const std::string &key, known_entry &entry)
 {
-    const known_entry read = entry.is_folder() ? entry_of(read_folder(owner_, key.c_str()).get())
-                                               : entry_of(read_file(owner_, key).get());
+    const known_entry read = entry.is_folder()
+                                 ? known_entry_of(read_folder(owner_, key.c_str()).get())
+                                 : known_entry_of(read_file(owner_, key).get());
     entry.name = read.name;
     entry.content = read.content;
     entry.described = true;
@@ -192,9 +192,9 @@ void account_reader::list(known_account &known, const std::string &key)
         steady_content({entry_kind::folder, key, known.entries.at(key).name, {}});
     std::vector<std::pair<std::string, known_entry>> found;
     for (const folder_info *each : content.folders)
-        found.emplace_back(checked_key(folder_info_get_folderkey(each)), entry_of(each));
+        found.emplace_back(checked_key(folder_info_get_folderkey(each)), known_entry_of(each));
     for (const file_info *each : content.files)
-        found.emplace_back(checked_key(file_info_get_quickkey(each)), entry_of(each));
+        found.emplace_back(checked_key(file_info_get_quickkey(each)), known_entry_of(each));
     known.add_listing(key, found);
 }
 
@@ -233,7 +233,7 @@ std::string account_reader::epoch()
     });
     const heap_text owned_revision(revision);
     const heap_text owned_epoch(epoch);
-    return text_of(epoch);
+    return text_or_empty(epoch);
 }
 
 // The more is known, the longer it takes to write it down.

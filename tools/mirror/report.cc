@@ -4,6 +4,7 @@
 
 #include "../console.h"
 #include "../results.h"
+#include "../text.h"
 #include "../transfers/progress.h"
 
 namespace quillmere::tools {
@@ -39,11 +40,6 @@ bool concerns_one_entry(const failure &problem)
 {
     return problem.code == exit_code::refused || problem.code == exit_code::local_file ||
            problem.code == exit_code::unreadable_answer;
-}
-
-nlohmann::ordered_json text_or_nothing(const std::string &text)
-{
-    return text.empty() ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
 }
 
 } // namespace
@@ -104,9 +100,9 @@ void mirror_report::tell(results &output, const known_account &account)
         rows.push_back(
             {{"action", json_word_for(each.action)},
              {"kind", word_for(each.kind)},
-             {"key", text_or_nothing(each.key)},
+             {"key", text_unless_empty(each.key)},
              {"path", each.path},
-             {"former_path", text_or_nothing(each.former_path)},
+             {"former_path", text_unless_empty(each.former_path)},
              {"size", each.action == mirror_action::fetched ? nlohmann::ordered_json(each.size)
                                                             : nlohmann::ordered_json(nullptr)}});
     std::string text = sentence();

@@ -4,12 +4,11 @@
 #include <set>
 
 #include "../folder_content.h"
+#include "../text.h"
 
 namespace quillmere::tools {
 
 namespace {
-
-std::string text_of(const char *text) { return text == nullptr ? "" : text; }
 
 /** Sees to it that no entry of a folder takes the place of another: names of attached folders may
  * be those of others. */
@@ -53,11 +52,12 @@ void fetcher::get_folder(const remote_entry &folder, const std::string &path,
     names_in_use names;
     for (const folder_info *each : content.folders)
         report_.attempt([&] {
-            const std::string name = text_of(folder_info_get_foldername(each));
+            const std::string name = text_or_empty(folder_info_get_foldername(each));
             const std::string inner_path = path_below(path, name);
             names.take(name, inner_path);
-            get_folder({entry_kind::folder, text_of(folder_info_get_folderkey(each)), name, {}},
-                       inner_path, into.enter(name));
+            get_folder(
+                {entry_kind::folder, text_or_empty(folder_info_get_folderkey(each)), name, {}},
+                inner_path, into.enter(name));
         });
     std::vector<wanted> missing;
     for (const file_info *each : content.files)

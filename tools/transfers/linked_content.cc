@@ -3,12 +3,11 @@
 #include <quillmere.h>
 
 #include "../failure.h"
+#include "../text.h"
 
 namespace quillmere::tools {
 
 namespace {
-
-std::string text_of(const char *text) { return text == nullptr ? "" : text; }
 
 std::string joined_keys(const std::vector<std::string> &keys)
 {
@@ -49,8 +48,8 @@ void linked_content::ask_for_links(const std::vector<std::string> &keys)
     });
     const file_links_list_owner owned(list);
     for (const file_links *each : in_order_sent(list))
-        links_[text_of(file_links_get_quickkey(each))] = {
-            text_of(file_links_get_direct_download(each)), refusal_in(each)};
+        links_[text_or_empty(file_links_get_quickkey(each))] = {
+            text_or_empty(file_links_get_direct_download(each)), refusal_in(each)};
 }
 
 const std::string &linked_content::require_link(const std::string &key,

@@ -20,7 +20,7 @@ using std::chrono::milliseconds;
 
 constexpr milliseconds between_draws{100};
 constexpr std::size_t usual_columns = 80;
-constexpr std::size_t name_columns = 24;
+constexpr std::size_t file_name_columns = 24;
 constexpr std::size_t smallest_bar = 10;
 constexpr const char *clear_line = "\r\x1b[K";
 
@@ -120,7 +120,7 @@ std::string bar_text(const progress_state &state, std::size_t columns_given, bar
                                                static_cast<double>(state.total);
     char percent[16];
     std::snprintf(percent, sizeof percent, "%3d%%", static_cast<int>(part * 100));
-    const std::string name = shortened(escape_controls(state.name), name_columns);
+    const std::string name = shortened(escape_controls(state.name), file_name_columns);
     const std::string before = name + "  " + percent + "  ";
     const std::string behind =
         "  " + size_text(state.done) + "  " + rate_text(state) + "  " + time_left_text(state);

@@ -10,8 +10,6 @@ namespace quillmere::tools {
 
 namespace {
 
-std::string text_of(const char *text) { return text == nullptr ? "" : text; }
-
 std::uint64_t number_of(const std::string &text)
 {
     std::uint64_t number = 0;
@@ -24,11 +22,11 @@ std::uint64_t number_of(const std::string &text)
 remote_file remote_file_of(const file_info *record)
 {
     remote_file file;
-    file.key = text_of(file_info_get_quickkey(record));
-    file.name = text_of(file_info_get_filename(record));
-    file.revision = text_of(file_info_get_revision(record));
-    file.content.size = number_of(text_of(file_info_get_size(record)));
-    file.content.sha256 = lower_case(text_of(file_info_get_hash(record)));
+    file.key = text_or_empty(file_info_get_quickkey(record));
+    file.name = text_or_empty(file_info_get_filename(record));
+    file.revision = text_or_empty(file_info_get_revision(record));
+    file.content.size = number_of(text_or_empty(file_info_get_size(record)));
+    file.content.sha256 = lower_case(text_or_empty(file_info_get_hash(record)));
     file.has_content = is_sha256_hex(file.content.sha256);
     return file;
 }
@@ -58,10 +56,10 @@ void remote_folder::list()
     const folder_content content =
         read_content(owner_, entry_, {entry_kind::folder, entry_kind::file});
     for (const folder_info *each : content.folders) {
-        const std::string name = text_of(folder_info_get_foldername(each));
-        folders_.emplace(name,
-                         remote_entry{entry_kind::folder, text_of(folder_info_get_folderkey(each)),
-                                      name, entry_.key});
+        const std::string name = text_or_empty(folder_info_get_foldername(each));
+        folders_.emplace(name, remote_entry{entry_kind::folder,
+                                            text_or_empty(folder_info_get_folderkey(each)), name,
+                                            entry_.key});
     }
     for (const file_info *each : content.files) {
         remote_file file = remote_file_of(each);

@@ -53,7 +53,7 @@ struct address {
 
 // What stands in an address goes into the request as it is, so that a blank in it would be taken
 // for the end of the target, and a line end for that of the field.
-address split(const std::string &url)
+address split_url(const std::string &url)
 {
     for (const char each : url)
         if (each <= ' ' || each == 0x7f)
@@ -68,7 +68,7 @@ address split(const std::string &url)
 
 std::string head_of(const upload &asked)
 {
-    const address to = split(asked.url);
+    const address to = split_url(asked.url);
     std::string head = "POST " + to.target + " HTTP/1.1\r\nHost: " + to.host +
                        "\r\nConnection: close\r\nContent-Type: application/octet-stream"
                        "\r\nContent-Length: " +
