@@ -239,7 +239,8 @@ protected:
 
 // Thousands of allocations of OpenSSL go into each connection. All of them are tried with
 // QUILLMERE_EVERY_ALLOCATION set, which takes minutes.
-const size_t shortage_step = std::getenv("QUILLMERE_EVERY_ALLOCATION") ? 1 : 7;
+const size_t shortage_step =
+    std::getenv("QUILLMERE_EVERY_ALLOCATION") ? 1 : 7 * QUILLMERE_EXHAUSTION_STEP;
 
 TEST_F(StarvedTransfers, OfLibcurlAreFailedAttempts)
 {
