@@ -117,7 +117,7 @@ void check_proxy(const proxy_choice &chosen, exit_code whose)
     if (user.size() < rest.size() && user.find(':') != std::string_view::npos)
         throw failure(whose, "the proxy of " + chosen.source + " holds a password",
                       "others can read it there: set https_proxy in the environment instead");
-    const bool clean = std::all_of(rest.begin(), rest.end(),
+    const bool clean = std::all_of(chosen.url.begin(), chosen.url.end(),
                                    [](char letter) { return letter > ' ' && letter < 0x7f; });
     if (rest.empty() || !clean)
         throw failure(whose, "the proxy of " + chosen.source + " is no address: " + chosen.url,

@@ -241,7 +241,8 @@ TEST_F(Settings, TakeTheProxyFromTheNearestSource)
 
 TEST_F(Settings, RefuseAProxyThatTellsAPasswordOrIsNone)
 {
-    for (const char *proxy : {"http://a:b@host", "a:b@host:1", "http://", "http://a b", "a\nb"}) {
+    for (const char *proxy :
+         {"http://a:b@host", "a:b@host:1", "http://", "http://a b", "a\nb", "ht tp://a"}) {
         given.proxy = proxy;
         EXPECT_EQ(code_of_failure(), exit_code::usage) << proxy;
         given.proxy.reset();
