@@ -27,7 +27,8 @@ struct sought_names {
 // Such a name is left to a pass of its own.
 bool unexpected(const std::string &name)
 {
-    return name.empty() || (name[0] == '/' && name.size() > quillmere::longest_path);
+    const bool is_path = name.find('/') != std::string::npos;
+    return name.empty() || (is_path && name.size() > quillmere::longest_path);
 }
 
 std::string as_text(const std::optional<std::string> &value) { return value.value_or("(none)"); }
