@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <ctime>
 #include <limits>
 #include <sstream>
 
@@ -10,6 +11,8 @@
 #include <boost/beast/http/empty_body.hpp>
 #include <boost/beast/http/message.hpp>
 #include <boost/beast/http/write.hpp>
+
+#include "times.h"
 
 namespace emulator {
 namespace {
@@ -24,6 +27,7 @@ std::string head_of(const reply &made, unsigned http_version, bool keep_alive)
     response.result(made.http_status);
     response.version(http_version);
     response.set(http::field::server, "quillmere-emulator");
+    response.set(http::field::date, http_date(std::time(nullptr)));
     response.set(http::field::content_type, "text/xml; charset=utf-8");
     response.set(http::field::cache_control, "no-store");
     if (response.result() == http::status::method_not_allowed)

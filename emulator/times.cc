@@ -1,7 +1,9 @@
 #include "times.h"
 
-#include <array>
 #include <ctime>
+#include <iomanip>
+#include <locale>
+#include <sstream>
 
 #include "text.h"
 
@@ -16,6 +18,16 @@ std::tm parts_of(std::int64_t seconds)
     std::tm parts{};
     ::gmtime_r(&when, &parts);
     return parts;
+}
+
+// Whatever language the machine speaks, the names of days and months are English.
+std::string formatted(std::int64_t seconds, const char *form)
+{
+    const std::tm parts = parts_of(seconds);
+    std::ostringstream text;
+    text.imbue(std::locale::classic());
+    text << std::put_time(&parts, form);
+    return text.str();
 }
 
 bool is_date_and_time(std::string_view text)
@@ -40,14 +52,14 @@ int part(std::string_view text, std::size_t at, std::size_t length)
 
 } // namespace
 
-std::string time_text(std::int64_t seconds)
-{
-    const std::tm parts = parts_of(seconds);
-    std::array<char, 32> text{};
-    return {text.data(), std::strftime(text.data(), text.size(), "%Y-%m-%d %H:%M:%S", &parts)};
-}
+std::string time_text(std::int64_t seconds) { return formatted(seconds, "%Y-%m-%d %H:%M:%S"); }
 
 std::string date_text(std::int64_t seconds) { return time_text(seconds).substr(0, 10); }
+
+std::string http_date(std::int64_t seconds)
+{
+    return formatted(seconds, "%a, %d %b %Y %H:%M:%S GMT");
+}
 
 std::optional<std::int64_t> parse_time(std::string_view text)
 {

@@ -1,18 +1,22 @@
 #include "http_server.h"
 
+#include <algorithm>
 #include <atomic>
 #include <chrono>
+#include <ctime>
 #include <future>
 #include <memory>
 #include <optional>
 #include <stdexcept>
 #include <string>
 #include <thread>
+#include <vector>
 
 #include <boost/asio/post.hpp>
 #include <gtest/gtest.h>
 
 #include "socket_client.h"
+#include "times.h"
 
 using namespace emulator;
 
@@ -139,6 +143,25 @@ TEST_F(HttpServer, HeadGetsTheLengthWithoutTheBody)
     const std::string reply = client.read_to_end();
     EXPECT_NE(reply.find("Content-Length: 14\r\n"), std::string::npos) << reply;
     EXPECT_TRUE(ends_with(reply, "\r\n\r\n"));
+}
+
+TEST_F(HttpServer, TellsTheTimeInEveryReply)
+{
+    start(small());
+    const auto asked = std::time(nullptr);
+
+    for (const std::string &request : {status_request, post(101)}) {
+        socket_client client(port);
+        client.send(request);
+        const std::string reply = client.read_reply();
+
+        std::vector<std::string> dates;
+        for (auto second = asked; second <= std::time(nullptr); ++second)
+            dates.push_back("\r\nDate: " + http_date(second) + "\r\n");
+        EXPECT_TRUE(std::any_of(dates.begin(), dates.end(), [&](const std::string &date) {
+            return reply.find(date) != std::string::npos;
+        })) << reply;
+    }
 }
 
 TEST_F(HttpServer, TakesABodyUpToItsLimit)

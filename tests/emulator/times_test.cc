@@ -11,6 +11,12 @@ TEST(Times, AreWrittenInUniversalTime)
     EXPECT_EQ(date_text(1'700'000'000), "2023-11-14");
 }
 
+TEST(Times, AreWrittenForAHeaderWithTheNameOfTheDay)
+{
+    EXPECT_EQ(http_date(0), "Thu, 01 Jan 1970 00:00:00 GMT");
+    EXPECT_EQ(http_date(1'700'000'000), "Tue, 14 Nov 2023 22:13:20 GMT");
+}
+
 TEST(Times, AreReadInEitherForm)
 {
     for (const char *text :

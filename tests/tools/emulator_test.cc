@@ -42,6 +42,15 @@ TEST_F(Emulator, LetsAUserSignInAndReadTheirDevice)
                                        "Jobs in progress  (yes|no)\n"));
 }
 
+TEST_F(Emulator, LeavesNothingForTheDoctorToFind)
+{
+    const nlohmann::json examined = result_of({"doctor"});
+
+    EXPECT_EQ(examined.at("healthy"), true);
+    for (const auto &each : examined.at("steps"))
+        EXPECT_EQ(each.at("result"), "ok") << each;
+}
+
 TEST_F(Emulator, AcceptsAFacebookToken)
 {
     const outcome ended = home.run(
