@@ -1,9 +1,10 @@
 // Calls to the system at which the program may be killed, ahead of them and behind them, as if the
-// power went: the environment says at which of them, counted from 1. The linker puts these in their
-// place.
+// power went: the environment says at which of them, counted from 1, or what has just got its name.
+// The linker puts these in their place.
 #include <csignal>
 #include <cstdarg>
 #include <cstdlib>
+#include <string>
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -30,6 +31,15 @@ template <class Result> Result passed(Result result)
 {
     pass_point();
     return result;
+}
+
+const char *const chosen_name = std::getenv("QUILLMERE_TEST_KILL_WHEN_NAMED");
+
+int named(int result, const char *new_name)
+{
+    if (chosen_name != nullptr && result == 0 && std::string(new_name) == chosen_name)
+        ::raise(SIGKILL);
+    return passed(result);
 }
 
 } // namespace
@@ -93,12 +103,12 @@ int __wrap_unlinkat(int folder, const char *name, int flags)
 int __wrap_renameat(int from, const char *name, int to, const char *new_name)
 {
     pass_point();
-    return passed(__real_renameat(from, name, to, new_name));
+    return named(__real_renameat(from, name, to, new_name), new_name);
 }
 
 int __wrap_renameat2(int from, const char *name, int to, const char *new_name, unsigned flags)
 {
     pass_point();
-    return passed(__real_renameat2(from, name, to, new_name, flags));
+    return named(__real_renameat2(from, name, to, new_name, flags), new_name);
 }
 }

@@ -43,6 +43,15 @@ protected:
         return told;
     }
 
+    /** A run that is killed at what the variable says. */
+    void run_killed(const std::string &variable, const std::string &value) const
+    {
+        command what = home.with({"mirror", "/", path(), "--retries", "0"});
+        what.program = QUILLMERE_KILLED_PROGRAM;
+        what.environment[variable] = value;
+        ASSERT_EQ(run(what).signal, SIGKILL);
+    }
+
     /** The paths in the copy, but for the mirror's own. */
     std::vector<std::string> paths() const
     {
@@ -233,11 +242,8 @@ TEST_F(Mirror, KeepsALocalChangeAlsoAfterARunThatCouldDoNothing)
     mirrored();
     write_here("a.txt", "mine");
     write_here("b.txt", "mine, too");
-    command away = home.with({"mirror", "/", path(), "--retries", "0"});
-    away.program = QUILLMERE_KILLED_PROGRAM;
     // When it has kept its first state, and does not know yet what became of the account.
-    away.environment["QUILLMERE_TEST_KILL_AT"] = "11";
-    ASSERT_EQ(run(away).signal, SIGKILL);
+    run_killed("QUILLMERE_TEST_KILL_AT", "11");
     done({"rm", "/a.txt"});
     put_content("/b.txt", "b2");
 
@@ -246,6 +252,23 @@ TEST_F(Mirror, KeepsALocalChangeAlsoAfterARunThatCouldDoNothing)
     EXPECT_EQ(content_of(path("a.txt")), "mine");
     EXPECT_EQ(content_of(path("b.txt.local-1")), "mine, too");
     EXPECT_EQ(content_of(path("b.txt")), "b2");
+}
+
+// What it was about to do has to be kept ahead of that, or else the bytes would be nobody's: by the
+// next run the account has others.
+TEST_F(Mirror, KnowsItsOwnFirstChangeAfterBeingKilledRightBehindIt)
+{
+    put_content("/a.txt", "a");
+    mirrored();
+    put_content("/a.txt", "a2");
+    run_killed("QUILLMERE_TEST_KILL_WHEN_NAMED", "a.txt");
+    ASSERT_EQ(content_of(path("a.txt")), "a2");
+    put_content("/a.txt", "a3");
+
+    EXPECT_THAT(steps(), ElementsAre("fetched a.txt"));
+
+    EXPECT_THAT(paths(), ElementsAre("a.txt"));
+    EXPECT_EQ(content_of(path("a.txt")), "a3");
 }
 
 TEST_F(Mirror, LeavesLocalFilesAloneAndTakesTheirPlaceForItsOwn)
