@@ -111,6 +111,7 @@ struct mirror_arguments {
     std::string local;
     int interval = 30; ///< in seconds
     bool follow = false;
+    bool dry_run = false;
     bool quiet = false;
 };
 

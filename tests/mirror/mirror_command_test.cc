@@ -1,6 +1,9 @@
 // The mirror as a user runs it, against the emulator.
 #include <csignal>
 #include <filesystem>
+#include <map>
+
+#include <sys/stat.h>
 
 #include <gmock/gmock.h>
 
@@ -15,6 +18,23 @@ using json = nlohmann::json;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::IsSupersetOf;
+using testing::UnorderedElementsAre;
+
+/** Everything below a folder, and what would show that it was touched. */
+std::map<std::string, std::vector<std::int64_t>> facts_below(const std::string &top)
+{
+    std::map<std::string, std::vector<std::int64_t>> found;
+    struct stat facts = {};
+    for (const auto &each : fs::recursive_directory_iterator(top)) {
+        EXPECT_EQ(::lstat(each.path().c_str(), &facts), 0) << each.path();
+        found[each.path()] = {static_cast<std::int64_t>(facts.st_ino), facts.st_mode, facts.st_size,
+                              facts.st_mtim.tv_sec, facts.st_mtim.tv_nsec};
+    }
+    EXPECT_EQ(::stat(top.c_str(), &facts), 0);
+    found[top] = {facts.st_mtim.tv_sec, facts.st_mtim.tv_nsec};
+    return found;
+}
 
 class Mirror : public transfer_account {
 protected:
@@ -29,10 +49,12 @@ protected:
     }
 
     /** What a run did, "moved new old" in its order. */
-    std::vector<std::string> steps() const
+    std::vector<std::string> steps(const std::vector<std::string> &more = {}) const
     {
         std::vector<std::string> told;
-        const json result = result_of({"mirror", "/", path(), "--quiet"});
+        std::vector<std::string> arguments = {"mirror", "/", path(), "--quiet"};
+        arguments.insert(arguments.end(), more.begin(), more.end());
+        const json result = result_of(arguments);
         for (const json &each : result.at("steps")) {
             std::string step = each.at("action");
             for (const char *name : {"path", "former_path"})
@@ -65,6 +87,15 @@ protected:
         }
         std::sort(found.begin(), found.end());
         return found;
+    }
+
+    /** What a dry run tells. It leaves the copy as it is, the mirror's own folder too. */
+    std::vector<std::string> foreseen_steps() const
+    {
+        const auto before = facts_below(path());
+        std::vector<std::string> told = steps({"--dry-run"});
+        EXPECT_EQ(facts_below(path()), before);
+        return told;
     }
 
     void write_here(const std::string &name, const std::string &bytes) const
@@ -463,6 +494,98 @@ TEST_F(Mirror, BringsListingsAndFeedsOfSeveralParts)
     EXPECT_EQ(content_of(path("last.txt")), "last");
 }
 
+TEST_F(Mirror, ForeseesANewCopyWithoutMakingIt)
+{
+    put_content("/photos/a.txt", "a");
+
+    const outcome ended = done({"mirror", "/photos", path(), "--dry-run"});
+
+    EXPECT_EQ(ended.out, "Would mirror /photos to " + path() + ": fetch 1 file (1 B)\n");
+    EXPECT_FALSE(fs::exists(path()));
+    EXPECT_EQ(result_of({"stat", "/photos/a.txt"}).at("downloads"), 0);
+}
+
+TEST_F(Mirror, ForeseesWhatMakesWayInAFolderThatIsNoMirrorYet)
+{
+    put_content("/same.txt", "same");
+    put_content("/other.txt", "other");
+    put_content("/folder/a.txt", "a");
+    put_content("/taken/b.txt", "b");
+    fs::create_directories(path("taken/b.txt"));
+    write_here("same.txt", "same");
+    write_here("other.txt", "mine");
+    write_here("other.txt.local-1", "mine, too");
+    write_here("folder", "no folder");
+
+    const auto foreseen = foreseen_steps();
+
+    EXPECT_THAT(foreseen,
+                UnorderedElementsAre("made folder", "fetched folder/a.txt", "fetched other.txt",
+                                     "fetched taken/b.txt", "kept folder.local-1 folder",
+                                     "kept other.txt.local-2 other.txt",
+                                     "kept taken/b.txt.local-1 taken/b.txt"));
+    EXPECT_EQ(steps(), foreseen);
+}
+
+TEST_F(Mirror, ForeseesChangesOfEveryKind)
+{
+    for (const char *each : {"/one/a.txt", "/two/a.txt", "/gone/deep/b.txt", "/gone/mine.txt",
+                             "/left/c.txt", "/outer/inner/d.txt", "/e.txt", "/f.txt", "/g.txt"})
+        put_content(each, each);
+    mirrored();
+    done({"mv", "/one", "/three"});
+    done({"mv", "/two", "/one"});
+    done({"mv", "/three", "/two"});
+    done({"rm", "-r", "/gone"});
+    done({"rm", "-r", "/left"});
+    done({"mv", "/outer/inner", "/"});
+    done({"mv", "/outer", "/inner"});
+    put_content("/e.txt", "e2");
+    done({"mv", "/f.txt", "/inner/outer"});
+    put_content("/inner/outer/f.txt", "f2");
+    put_content("/left/extra.txt", "now the account's");
+    put_content("/again.txt", "/left/c.txt"); // the bytes of what goes
+    write_here("gone/mine.txt", "changed here");
+    write_here("left/extra.txt", "extra");
+    write_here("g.txt", "changed here, too");
+
+    const auto foreseen = foreseen_steps();
+
+    EXPECT_THAT(foreseen, IsSupersetOf({"moved two one", "moved one two", "removed gone/deep",
+                                        "moved again.txt left/c.txt", "kept gone",
+                                        "kept gone/mine.txt", "kept g.txt.local-1 g.txt",
+                                        "kept left/extra.txt.local-1 left/extra.txt",
+                                        "fetched e.txt", "fetched inner/outer/f.txt"}));
+    EXPECT_EQ(steps(), foreseen);
+}
+
+TEST_F(Mirror, SaysOfADryRunThatNothingIsDoneYet)
+{
+    put_content("/a.txt", "a");
+    mirrored();
+    put_content("/b.txt", "bb");
+    write_here("b.txt", "mine");
+
+    const outcome ended = done({"mirror", "/", path(), "-n"});
+
+    EXPECT_EQ(ended.out, "Would mirror / to " + path() + ": fetch 1 file (2 B), keep 1\n");
+    EXPECT_THAT(ended.err, HasSubstr("b.txt is not the account's; it would be kept as "));
+    EXPECT_EQ(content_of(path("b.txt")), "mine");
+}
+
+TEST_F(Mirror, ForeseesNothingWhenNothingChanged)
+{
+    put_content("/a.txt", "a");
+    mirrored();
+
+    EXPECT_EQ(done({"mirror", "/", path(), "--dry-run"}).out, path() + " is up to date\n");
+}
+
+TEST_F(Mirror, FollowsNothingInADryRun)
+{
+    error_of({"mirror", "/", path(), "--dry-run", "--follow"}, 2);
+}
+
 TEST_F(HostileService, LeadsTheMirrorNowhereElse)
 {
     for (const char *evil : {"../evil", "..", "/evil", "deep/evil", ".quillmere-mirror"}) {
@@ -496,6 +619,7 @@ TEST_F(Mirror, FollowsUntilItIsInterrupted)
     EXPECT_THAT(following.wait_for_line(channel::out), HasSubstr("fetched 1 file (1 B)"));
     EXPECT_THAT(error_of({"mirror", "/", path()}, 9).at("message"),
                 HasSubstr("another process is mirroring"));
+    error_of({"mirror", "/", path(), "--dry-run"}, 9);
 
     put_content("/b.txt", "bb");
 

@@ -78,6 +78,8 @@ private:
 tree tree_on_disk(const std::string &top)
 {
     tree found;
+    if (!fs::exists(top))
+        return found;
     for (auto each = fs::recursive_directory_iterator(top);
          each != fs::recursive_directory_iterator(); ++each) {
         const std::string path = fs::relative(each->path(), top);
@@ -142,10 +144,19 @@ protected:
         note_end(running.wait());
     }
 
+    /** Does what a dry run ahead of it has told. */
     void run_unhindered(bool all_shown)
     {
-        const outcome ended = run(mirror_command(QUILLMERE_PROGRAM));
+        const tree before = tree_on_disk(local());
+        const outcome foreseen = run(mirror_command(QUILLMERE_PROGRAM, {"--json", "--dry-run"}));
+        EXPECT_EQ(tree_on_disk(local()), before);
+
+        const outcome ended = run(mirror_command(QUILLMERE_PROGRAM, {"--json"}));
         EXPECT_EQ(ended.exit_status, all_shown ? 0 : 8) << ended.err;
+        EXPECT_EQ(foreseen.exit_status, ended.exit_status);
+        if (all_shown) {
+            EXPECT_EQ(foreseen.out, ended.out);
+        }
         note_end(ended);
     }
 
@@ -220,9 +231,10 @@ private:
         home.sign_in(url, sessions[ann]);
     }
 
-    command mirror_command(const char *program) const
+    command mirror_command(const char *program, const std::vector<std::string> &more = {}) const
     {
         command what = home.with({"mirror", "/", local(), "--retries", "0", "--quiet"});
+        what.arguments.insert(what.arguments.end(), more.begin(), more.end());
         what.program = program;
         return what;
     }

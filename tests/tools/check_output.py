@@ -144,6 +144,7 @@ def check_tree(checker):
     checker.check("update", home.write("one.txt", "three\n"), "/a/one.txt")
     checker.check("get", "/a/one.txt", home.path("back.txt"))
     checker.check("get", "/a/one.txt", home.path("back.txt"))
+    checker.check("mirror", "/a", home.path("copy"), "--dry-run")
     checker.check("mirror", "/a", home.path("copy"))
     checker.check("mirror", "/a", home.path("copy"))
     checker.check("ls", "/a")

@@ -94,6 +94,8 @@ void declare_mirror(CLI::App &options, arguments &given)
         ->option_text(" ");
     auto *const follow =
         options.add_flag("--follow", mirror.follow, "Go on, and do what changes in the account");
+    options.add_flag("-n,--dry-run", mirror.dry_run, "Tell what would be done, and do nothing")
+        ->excludes(follow);
     options
         .add_option("--interval", mirror.interval,
                     "Time from one look for changes to the next; 30 unless given")
@@ -108,16 +110,21 @@ void run_mirror(command_context &context)
     const mirror_arguments &given = context.given.mirror;
     const account owner = signed_in_account(context);
     const std::string root = key_of(owner, find_folder(tree_of(owner), given.remote));
-    const local_copy copy(given.local);
+    const local_copy copy =
+        given.dry_run ? local_copy::to_look_at(given.local) : local_copy(given.local);
     linked_content contents(owner, context.chosen(),
                             context.given.common.plain_http ? link_security::plain_too
                                                             : link_security::tls_alone,
                             progress_style_for(given.quiet));
-    mirror_report report(given.remote, given.local);
+    mirror_report report(given.remote, given.local,
+                         given.dry_run ? mirror_tense::foreseen : mirror_tense::done);
     mirroring mirror(owner, root, copy, contents, report);
     if (given.follow)
         follow(mirror, report, given, context.output);
-    mirror.run();
+    if (given.dry_run)
+        mirror.foresee();
+    else
+        mirror.run();
     report.require_success();
     report.tell(context.output, mirror.known());
 }

@@ -1,10 +1,6 @@
 #include "applier.h"
 
 #include <algorithm>
-#include <cerrno>
-
-#include <fcntl.h>
-#include <sys/stat.h>
 
 #include "../failure.h"
 #include "local_names.h"
@@ -44,8 +40,7 @@ void applier::each_of(const std::vector<std::string> &keys, step taken)
 void applier::rescue(const std::string &key)
 {
     const placement &placed = here_.at(key);
-    keep_beside(copy_.own(), local_copy::aside_name(key), placed.name, copy_.top(), wanted_->root,
-                placed.name);
+    keep_beside(aside(key), placed.name, {wanted_->root, placed.name});
     here_.erase(key);
 }
 
@@ -55,17 +50,15 @@ void applier::let_go(const std::string &key)
     here_.erase(key);
     if (wanted_->key_at(placed.parent, placed.name) != nullptr)
         return; // it will have to make way, which is told then
-    const std::string path = folders_.path_of(placed);
+    const std::string path = path_of(placed, here_);
     report_.keep(entry_kind::file, path, path);
 }
 
 void applier::set_aside(const std::string &key)
 {
     placement &placed = here_.at(key);
-    const std::string path = folders_.path_of(placed);
-    const std::string name = local_copy::aside_name(key);
-    if (!move_to_free_name(folders_.open(placed.parent), placed.name, copy_.own(), name))
-        throw failure(exit_code::local_file, copy_.own().path_of(name) + " is in the way");
+    const std::string path = path_of(placed, here_);
+    move({placed.parent, placed.name}, aside(key));
     placed.set_aside = true;
     former_paths_[key] = path;
 }
@@ -74,19 +67,15 @@ void applier::set_aside(const std::string &key)
 void applier::leave(const std::string &key)
 {
     const placement placed = here_.at(key);
-    const std::string path = folders_.path_of(placed);
-    const std::string name = placed.set_aside ? local_copy::aside_name(key) : placed.name;
-    const local_folder above =
-        placed.set_aside ? copy_.own().again() : folders_.open(placed.parent);
-    if (::unlinkat(above.number(), name.c_str(), AT_REMOVEDIR) == 0 || errno == ENOENT) {
+    const std::string path = path_of(placed, here_);
+    const location at = placed.set_aside ? aside(key) : location{placed.parent, placed.name};
+    if (disk_.remove_folder(key, at)) {
         here_.erase(key);
         report_.add({mirror_action::removed, entry_kind::folder, key, path, {}, 0});
         return;
     }
-    if (errno != ENOTEMPTY && errno != EEXIST)
-        throw file_failure("cannot remove " + report_.local_path_of(path), errno);
     if (placed.set_aside)
-        keep_beside(above, name, placed.name, copy_.top(), wanted_->root, placed.name);
+        keep_beside(at, placed.name, {wanted_->root, placed.name});
     else if (wanted_->key_at(placed.parent, placed.name) == nullptr)
         report_.keep(entry_kind::folder, path, path);
     here_.erase(key);
@@ -97,19 +86,16 @@ void applier::place_folder(const std::string &key)
     if (!has_place_for(key))
         return;
     const wanted_entry &wanted = wanted_->entries.at(key);
-    const local_folder above = folders_.open(wanted.parent);
-    const auto found = here_.find(key);
-    const bool is_here = found != here_.end();
+    const location to = {wanted.parent, wanted.name};
+    const bool is_here = here_.count(key) != 0;
     if (is_here) {
-        make_way(above, wanted.parent, wanted.name);
-        if (!move_to_free_name(copy_.own(), local_copy::aside_name(key), above, wanted.name))
-            throw failure(exit_code::local_file, above.path_of(wanted.name) + " is in the way");
-    } else if (above.entry(wanted.name) != local_entry::folder) {
-        make_way(above, wanted.parent, wanted.name);
-        if (::mkdirat(above.number(), wanted.name.c_str(), 0777) != 0)
-            throw file_failure("cannot make the folder " + above.path_of(wanted.name), errno);
+        make_way(to);
+        move(aside(key), to);
+    } else if (disk_.entry(to) != local_entry::folder) {
+        make_way(to);
+        disk_.make_folder(to);
     }
-    const auto stamp = stamp_of_folder(above, wanted.name);
+    const auto stamp = disk_.stamp(entry_kind::folder, to);
     here_[key] = {entry_kind::folder, wanted.parent, wanted.name, {}, stamp.value_or(file_stamp())};
     report_.add({is_here ? mirror_action::moved : mirror_action::made, entry_kind::folder, key,
                  wanted_->path_of(key), former_paths_[key], 0});
@@ -121,10 +107,9 @@ void applier::place_file(const std::string &key)
         return;
     placement &placed = here_.at(key);
     const wanted_entry &wanted = wanted_->entries.at(key);
-    const local_folder folder = folders_.open(wanted.parent);
-    make_way(folder, wanted.parent, wanted.name);
-    if (!move_to_free_name(copy_.own(), local_copy::aside_name(key), folder, wanted.name))
-        throw failure(exit_code::local_file, folder.path_of(wanted.name) + " is in the way");
+    const location to = {wanted.parent, wanted.name};
+    make_way(to);
+    move(aside(key), to);
     placed.set_aside = false;
     placed.parent = wanted.parent;
     placed.name = wanted.name;
@@ -136,14 +121,13 @@ void applier::place_file(const std::string &key)
 void applier::discard(const std::string &key)
 {
     const placement &placed = here_.at(key);
-    const std::string name = local_copy::aside_name(key);
-    const auto stamp = stamp_of_file(copy_.own(), name);
+    const auto stamp = disk_.stamp(entry_kind::file, aside(key));
     if (stamp && !(*stamp == placed.stamp)) {
         rescue(key);
         return;
     }
-    if (stamp && ::unlinkat(copy_.own().number(), name.c_str(), 0) != 0)
-        throw file_failure("cannot remove " + copy_.own().path_of(name), errno);
+    if (stamp)
+        disk_.remove_file(aside(key));
     const auto former = former_paths_.find(key);
     report_.add({mirror_action::removed,
                  entry_kind::file,
@@ -187,20 +171,18 @@ void applier::find_reusable()
 bool applier::is_at_hand(const std::string &key)
 {
     const wanted_entry &wanted = wanted_->entries.at(key);
-    const local_folder folder = folders_.open(wanted.parent);
-    if (here_.count(key) == 0 && folder.has(wanted.name, wanted.content)) {
-        record_file(key, folder);
+    if (here_.count(key) == 0 && disk_.has({wanted.parent, wanted.name}, wanted.content)) {
+        record_file(key);
         return true;
     }
     const auto reusable = reusable_.find(wanted.content.sha256);
     if (reusable == reusable_.end())
         return false;
     const std::string other = reusable->second;
-    const std::string name = local_copy::aside_name(other);
     reusable_.erase(reusable);
-    if (!copy_.own().has(name, wanted.content))
+    if (!disk_.has(aside(other), wanted.content))
         return false;
-    put_into_place(key, copy_.own(), name);
+    put_into_place(key, aside(other));
     here_.erase(other);
     report_.add({mirror_action::moved, entry_kind::file, key, wanted_->path_of(key),
                  former_paths_[other], 0});
@@ -216,7 +198,7 @@ void applier::fetch_all(const std::vector<std::string> &keys)
     bool asked = linked.empty();
     report_.attempt([&] {
         if (!asked)
-            contents_.ask_for_links(linked);
+            disk_.expect(linked);
         asked = true;
     });
     if (asked)
@@ -229,14 +211,8 @@ void applier::fetch(const std::string &key)
     const std::string path = path_below(report_.remote_path(), wanted_->path_of(key));
     if (!is_sha256_hex(wanted.content.sha256))
         throw failure(exit_code::refused, "the service does not tell the hash of " + path);
-    partial_file partial(copy_.own().number(), wanted.content);
-    if (wanted.content.size > 0)
-        contents_.bring(key, path, partial);
-    else if (!partial.is_right())
-        throw failure(exit_code::unreadable_answer, "no empty file has the hash of " + path);
-    partial.flush();
-    put_into_place(key, copy_.own(), partial.name());
-    partial.left();
+    disk_.fetch({key, path, wanted.content},
+                [&](const location &arrived) { put_into_place(key, arrived); });
     report_.add({mirror_action::fetched,
                  entry_kind::file,
                  key,
@@ -246,28 +222,26 @@ void applier::fetch(const std::string &key)
 }
 
 // In place of what the mirror wrote itself, and of nothing else.
-void applier::put_into_place(const std::string &key, const local_folder &from,
-                             const std::string &name)
+void applier::put_into_place(const std::string &key, const location &from)
 {
     const wanted_entry &wanted = wanted_->entries.at(key);
-    const local_folder folder = folders_.open(wanted.parent);
+    const location to = {wanted.parent, wanted.name};
     const auto found = here_.find(key);
     const bool own =
-        found != here_.end() && stamp_of_file(folder, wanted.name) == found->second.stamp;
+        found != here_.end() && disk_.stamp(entry_kind::file, to) == found->second.stamp;
     if (own) {
-        move_over(from, name, folder, wanted.name);
+        disk_.move_over(from, to);
     } else {
-        make_way(folder, wanted.parent, wanted.name);
-        if (!move_to_free_name(from, name, folder, wanted.name))
-            throw failure(exit_code::local_file, folder.path_of(wanted.name) + " is in the way");
+        make_way(to);
+        move(from, to);
     }
-    record_file(key, folder);
+    record_file(key);
 }
 
-void applier::record_file(const std::string &key, const local_folder &folder)
+void applier::record_file(const std::string &key)
 {
     const wanted_entry &wanted = wanted_->entries.at(key);
-    const auto stamp = stamp_of_file(folder, wanted.name);
+    const auto stamp = disk_.stamp(entry_kind::file, {wanted.parent, wanted.name});
     here_[key] = {entry_kind::file, wanted.parent, wanted.name, wanted.content,
                   stamp.value_or(file_stamp())};
 }
@@ -290,25 +264,31 @@ bool applier::is_set_aside(const std::string &key) const
     return found != here_.end() && found->second.set_aside;
 }
 
-void applier::make_way(const local_folder &folder, const std::string &parent,
-                       const std::string &name)
+void applier::move(const location &from, const location &to)
 {
-    if (folder.entry(name) != local_entry::nothing)
-        keep_beside(folder, name, local_path(parent, name), folder, parent, name);
+    if (disk_.move(from, to))
+        return;
+    const std::string path = to.folder == own_folder
+                                 ? std::string(mirror_folder_name) + "/" + to.name
+                                 : local_path(to.folder, to.name);
+    throw failure(exit_code::local_file, report_.local_path_of(path) + " is in the way");
 }
 
-void applier::keep_beside(const local_folder &from, const std::string &name,
-                          const std::string &former, const local_folder &to,
-                          const std::string &parent, const std::string &wanted_name)
+void applier::make_way(const location &at)
+{
+    if (disk_.entry(at) != local_entry::nothing)
+        keep_beside(at, local_path(at.folder, at.name), at);
+}
+
+void applier::keep_beside(const location &from, const std::string &former, const location &wanted)
 {
     const entry_kind kind =
-        from.entry(name) == local_entry::folder ? entry_kind::folder : entry_kind::file;
+        disk_.entry(from) == local_entry::folder ? entry_kind::folder : entry_kind::file;
     for (unsigned number = 1;; ++number) {
-        const std::string beside = name_beside(wanted_name, number);
-        if (wanted_->key_at(parent, beside) != nullptr ||
-            !move_to_free_name(from, name, to, beside))
+        const location beside = {wanted.folder, name_beside(wanted.name, number)};
+        if (wanted_->key_at(beside.folder, beside.name) != nullptr || !disk_.move(from, beside))
             continue;
-        report_.keep(kind, local_path(parent, beside), former);
+        report_.keep(kind, local_path(beside.folder, beside.name), former);
         return;
     }
 }

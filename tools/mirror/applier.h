@@ -6,8 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "../transfers/linked_content.h"
-#include "local_copy.h"
+#include "disk.h"
 #include "plan.h"
 #include "report.h"
 #include "state.h"
@@ -17,10 +16,8 @@ namespace quillmere::tools {
 class applier {
 public:
     /** @param keep called when what was placed should be kept; all others outlive the object */
-    applier(const local_copy &copy, mirror_state &state, linked_content &contents,
-            mirror_report &report, std::function<void()> keep)
-        : copy_(copy), here_(state.here), folders_(copy, state.account.root, state.here),
-          contents_(contents), report_(report), keep_(std::move(keep))
+    applier(disk &where, placements &here, mirror_report &report, std::function<void()> keep)
+        : disk_(where), here_(here), report_(report), keep_(std::move(keep))
     {
     }
 
@@ -44,21 +41,18 @@ private:
     bool is_at_hand(const std::string &key);
     void fetch_all(const std::vector<std::string> &keys);
     void fetch(const std::string &key);
-    void put_into_place(const std::string &key, const local_folder &from, const std::string &name);
-    void record_file(const std::string &key, const local_folder &folder);
+    void put_into_place(const std::string &key, const location &from);
+    void record_file(const std::string &key);
 
     bool has_place_for(const std::string &key) const;
     bool is_set_aside(const std::string &key) const;
-    void make_way(const local_folder &folder, const std::string &parent, const std::string &name);
-    void keep_beside(const local_folder &from, const std::string &name, const std::string &former,
-                     const local_folder &to, const std::string &parent,
-                     const std::string &wanted_name);
+    void move(const location &from, const location &to);
+    void make_way(const location &at);
+    void keep_beside(const location &from, const std::string &former, const location &wanted);
     std::string local_path(const std::string &parent, const std::string &name) const;
 
-    const local_copy &copy_;
+    disk &disk_;
     placements &here_;
-    copy_folders folders_;
-    linked_content &contents_;
     mirror_report &report_;
     std::function<void()> keep_;
     const layout *wanted_ = nullptr;

@@ -29,18 +29,6 @@ struct closer {
     void operator()(DIR *open) const { ::closedir(open); }
 };
 
-std::vector<std::string> names_in(const local_folder &folder)
-{
-    const std::unique_ptr<DIR, closer> open(
-        ::fdopendir(::openat(folder.number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC)));
-    if (!open)
-        throw file_failure("cannot read the folder " + folder.path(), errno);
-    std::vector<std::string> names;
-    while (const dirent *each = ::readdir(open.get()))
-        names.emplace_back(each->d_name);
-    return names;
-}
-
 bool look(const local_folder &folder, const std::string &name, struct stat &facts)
 {
     if (::fstatat(folder.number(), name.c_str(), &facts, AT_SYMLINK_NOFOLLOW) == 0)
@@ -58,24 +46,41 @@ std::int64_t nanoseconds_of(const timespec &time)
 } // namespace
 
 local_copy::local_copy(const std::string &path)
-    : top_(made_folder(path)), own_(top_.enter(mirror_folder_name))
+    : top_(made_folder(path)), own_(top_->enter(mirror_folder_name)), may_be_changed_(true)
 {
-    ::fchmod(own_.number(), 0700);
-    if (::flock(own_.number(), LOCK_EX | LOCK_NB) != 0)
-        throw failure(exit_code::local_file, "another process is mirroring into " + path);
+    ::fchmod(own_->number(), 0700);
+    lock(LOCK_EX);
+}
+
+local_copy local_copy::to_look_at(const std::string &path)
+{
+    local_copy copy;
+    if (::access(path.c_str(), F_OK) != 0 && errno == ENOENT)
+        return copy;
+    copy.top_.emplace(path);
+    copy.own_ = copy.top_->find(mirror_folder_name);
+    if (copy.is_begun())
+        copy.lock(LOCK_SH);
+    return copy;
+}
+
+void local_copy::lock(int kind) const
+{
+    if (::flock(own_->number(), kind | LOCK_NB) != 0)
+        throw failure(exit_code::local_file, "another process is mirroring into " + top_->path());
 }
 
 void local_copy::clear_downloads() const
 {
-    for (const std::string &name : names_in(own_))
+    for (const std::string &name : names_in(*own_))
         if (starts_with(name, ".quillmere-") && ends_with(name, ".part"))
-            ::unlinkat(own_.number(), name.c_str(), 0);
+            ::unlinkat(own_->number(), name.c_str(), 0);
 }
 
 std::optional<local_folder> copy_folders::find(const std::string &key) const
 {
     if (key == root_)
-        return copy_.top().again();
+        return copy_.exists() ? std::optional(copy_.top().again()) : std::nullopt;
     const auto found = here_.find(key);
     if (found == here_.end() || !found->second.is_folder())
         return std::nullopt;
@@ -95,12 +100,24 @@ local_folder copy_folders::open(const std::string &key) const
     return std::move(*found);
 }
 
-std::string copy_folders::path_of(const placement &placed) const
+std::string path_of(const placement &placed, const placements &here)
 {
-    const auto above = here_.find(placed.parent);
-    if (placed.set_aside || above == here_.end())
+    const auto above = here.find(placed.parent);
+    if (placed.set_aside || above == here.end())
         return placed.name;
-    return path_of(above->second) + "/" + placed.name;
+    return path_of(above->second, here) + "/" + placed.name;
+}
+
+std::vector<std::string> names_in(const local_folder &folder)
+{
+    const std::unique_ptr<DIR, closer> open(
+        ::fdopendir(::openat(folder.number(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC)));
+    if (!open)
+        throw file_failure("cannot read the folder " + folder.path(), errno);
+    std::vector<std::string> names;
+    while (const dirent *each = ::readdir(open.get()))
+        names.emplace_back(each->d_name);
+    return names;
 }
 
 std::optional<file_stamp> stamp_of_file(const local_folder &folder, const std::string &name)

@@ -4,6 +4,7 @@
 
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "../transfers/local_folder.h"
 #include "placement.h"
@@ -16,9 +17,18 @@ public:
      * failure when another process mirrors into it. */
     explicit local_copy(const std::string &path);
 
-    const local_folder &top() const { return top_; }
-    /** The mirror's own: the state, what is set aside, and downloads on their way. */
-    const local_folder &own() const { return own_; }
+    /** The same, but only to look at: what is missing stays so, and nothing is to be changed. */
+    static local_copy to_look_at(const std::string &path);
+    bool may_be_changed() const { return may_be_changed_; }
+
+    bool exists() const { return top_.has_value(); }
+    /** Of a copy that exists. */
+    const local_folder &top() const { return *top_; }
+    /** Whether a mirror has been at work in it. */
+    bool is_begun() const { return own_.has_value(); }
+    /** The mirror's own, of a copy that is begun: the state, what is set aside, and downloads on
+     * their way. */
+    const local_folder &own() const { return *own_; }
 
     /** The name under which an entry is set aside. */
     static std::string aside_name(const std::string &key) { return "entry-" + key; }
@@ -27,8 +37,12 @@ public:
     void clear_downloads() const;
 
 private:
-    local_folder top_;
-    local_folder own_;
+    local_copy() = default;
+    void lock(int kind) const;
+
+    std::optional<local_folder> top_;
+    std::optional<local_folder> own_;
+    bool may_be_changed_ = false;
 };
 
 /** Opens the folders of a copy by their keys, from where they are. */
@@ -45,14 +59,17 @@ public:
     /** The same, but a failure then. */
     local_folder open(const std::string &key) const;
 
-    /** Where an entry is, from the mirrored folder on. */
-    std::string path_of(const placement &placed) const;
-
 private:
     const local_copy &copy_;
     const std::string &root_;
     const placements &here_;
 };
+
+/** Where an entry is, from the mirrored folder on. */
+std::string path_of(const placement &placed, const placements &here);
+
+/** What a folder holds, "." and ".." too. */
+std::vector<std::string> names_in(const local_folder &folder);
 
 /** The stamp of what has a name: of a regular file, or of a folder. */
 std::optional<file_stamp> stamp_of_file(const local_folder &folder, const std::string &name);

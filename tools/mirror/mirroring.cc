@@ -31,7 +31,9 @@ mirroring::mirroring(const account &owner, const std::string &root, const local_
 
 mirror_state mirroring::loaded_state(const local_copy &copy, const std::string &root)
 {
-    mirror_state state = load_state(copy.own().number()).value_or(mirror_state());
+    mirror_state state;
+    if (copy.is_begun())
+        state = load_state(copy.own().number()).value_or(mirror_state());
     if (!state.account.root.empty() && state.account.root != root)
         throw failure(exit_code::usage,
                       copy.top().path() +
@@ -61,6 +63,12 @@ bool mirroring::run_if_new()
     return true;
 }
 
+void mirroring::foresee()
+{
+    learn();
+    agree();
+}
+
 bool mirroring::learn()
 {
     try {
@@ -86,10 +94,24 @@ void mirroring::agree()
     for (const auto &[key, refusal] : reader_.refusals())
         report_.count_failure(refusal);
     const plan steps = make_plan(wanted, state_.here, unlisted_folders(state_.account));
-    applier(copy_, state_, contents_, report_, [this] { keep(); }).apply(steps, wanted);
+    applier(*disk_to_change(), state_.here, report_, [this] { keep(); }).apply(steps, wanted);
     behind_ = report_.failures() > 0;
-    if (!behind_)
+    if (!behind_ && copy_.may_be_changed())
         copy_.clear_downloads();
+}
+
+std::unique_ptr<disk> mirroring::disk_to_change() const
+{
+    const std::string &root = state_.account.root;
+    if (copy_.may_be_changed())
+        return std::make_unique<real_disk>(copy_, root, state_.here, contents_);
+    return std::make_unique<imagined_disk>(copy_, root, state_.here);
+}
+
+void mirroring::keep()
+{
+    if (copy_.may_be_changed())
+        save_state(copy_.own().number(), state_);
 }
 
 } // namespace quillmere::tools

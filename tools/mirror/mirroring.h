@@ -2,6 +2,8 @@
 // both are kept on the way, so that a run that is killed is gone on with by the next.
 #pragma once
 
+#include <memory>
+
 #include "account_reader.h"
 #include "applier.h"
 #include "local_copy.h"
@@ -27,13 +29,17 @@ public:
     /** The same, if there is anything to do; true then. */
     bool run_if_new();
 
+    /** Reports the steps of a run. Of a copy to look at, with which nothing else is to be done. */
+    void foresee();
+
     const known_account &known() const { return state_.account; }
 
 private:
     static mirror_state loaded_state(const local_copy &copy, const std::string &root);
     bool learn();
     void agree();
-    void keep() { save_state(copy_.own().number(), state_); }
+    std::unique_ptr<disk> disk_to_change() const;
+    void keep();
 
     const local_copy &copy_;
     linked_content &contents_;

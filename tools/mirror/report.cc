@@ -14,14 +14,15 @@ namespace {
 struct action_words {
     mirror_action action;
     const char *json;
-    const char *done; // "fetched 3 files"
+    const char *done;     // "fetched 3 files"
+    const char *foreseen; // "fetch 3 files"
 };
 
-constexpr action_words words[] = {{mirror_action::made, "made", "made "},
-                                  {mirror_action::fetched, "fetched", "fetched "},
-                                  {mirror_action::moved, "moved", "moved "},
-                                  {mirror_action::removed, "removed", "removed "},
-                                  {mirror_action::kept, "kept", "kept "}};
+constexpr action_words words[] = {{mirror_action::made, "made", "made ", "make "},
+                                  {mirror_action::fetched, "fetched", "fetched ", "fetch "},
+                                  {mirror_action::moved, "moved", "moved ", "move "},
+                                  {mirror_action::removed, "removed", "removed ", "remove "},
+                                  {mirror_action::kept, "kept", "kept ", "keep "}};
 
 const char *json_word_for(mirror_action action)
 {
@@ -53,13 +54,16 @@ void mirror_report::add(mirror_step step) { steps_.push_back(std::move(step)); }
 
 void mirror_report::keep(entry_kind kind, const std::string &path, const std::string &former_path)
 {
+    const std::string stays = either("it stays", "it would stay");
     if (path == former_path && kind == entry_kind::folder)
-        note(local_path_of(path) + " is no longer the account's; it stays for what else it holds");
+        note(local_path_of(path) + " is no longer the account's; " + stays +
+             " for what else it holds");
     else if (path == former_path)
-        note(local_path_of(path) + " is no longer the account's; it stays, as it was changed here");
+        note(local_path_of(path) + " is no longer the account's; " + stays +
+             ", as it was changed here");
     else
-        note(local_path_of(former_path) + " is not the account's; it is kept as " +
-             local_path_of(path));
+        note(local_path_of(former_path) + " is not the account's; it " + either("is", "would be") +
+             " kept as " + local_path_of(path));
     add({mirror_action::kept, kind, {}, path, path == former_path ? "" : former_path, 0});
 }
 
@@ -106,7 +110,7 @@ void mirror_report::tell(results &output, const known_account &account)
              {"size", each.action == mirror_action::fetched ? nlohmann::ordered_json(each.size)
                                                             : nlohmann::ordered_json(nullptr)}});
     std::string text = sentence();
-    text.front() = 'M';
+    text.front() = *either("M", "W");
     output.sentence(steps_.empty() ? local_path_ + " is up to date" : text,
                     {{"key", nullptr, account.root},
                      {"device_revision", nullptr, account.revision},
@@ -144,14 +148,15 @@ std::string mirror_report::sentence() const
         }
         if (count == 0)
             continue;
-        done += (done.empty() ? ": " : ", ") + std::string(word.done);
+        done += done.empty() ? ": " : ", ";
+        done += either(word.done, word.foreseen);
         done += word.action == mirror_action::made      ? counted(count, "folder", "folders")
                 : word.action == mirror_action::fetched ? counted(count, "file", "files")
                                                         : std::to_string(count);
         if (word.action == mirror_action::fetched)
             done += " (" + size_text(bytes) + ")";
     }
-    return "mirrored " + remote_path_ + " to " + local_path_ + done;
+    return either("mirrored ", "would mirror ") + remote_path_ + " to " + local_path_ + done;
 }
 
 std::string mirror_report::incompleteness() const

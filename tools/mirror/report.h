@@ -17,6 +17,9 @@ class results;
 
 enum class mirror_action { made, fetched, moved, removed, kept };
 
+/** Whether a report tells what was done, or what would be. */
+enum class mirror_tense { done, foreseen };
+
 /** One thing that was done. Paths begin at the copy's top. */
 struct mirror_step {
     mirror_action action = mirror_action::made;
@@ -30,8 +33,9 @@ struct mirror_step {
 class mirror_report {
 public:
     /** The two paths are for messages. */
-    mirror_report(std::string remote_path, std::string local_path)
-        : remote_path_(std::move(remote_path)), local_path_(std::move(local_path))
+    mirror_report(std::string remote_path, std::string local_path,
+                  mirror_tense tense = mirror_tense::done)
+        : remote_path_(std::move(remote_path)), local_path_(std::move(local_path)), tense_(tense)
     {
     }
 
@@ -63,11 +67,16 @@ public:
     void note_incomplete() const;
 
 private:
+    const char *either(const char *if_done, const char *if_foreseen) const
+    {
+        return tense_ == mirror_tense::done ? if_done : if_foreseen;
+    }
     std::string sentence() const;
     std::string incompleteness() const;
 
     std::string remote_path_;
     std::string local_path_;
+    mirror_tense tense_;
     std::vector<mirror_step> steps_;
     std::set<std::string> left_out_; // keys
     std::optional<failure> first_failure_;
