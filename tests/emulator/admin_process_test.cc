@@ -19,7 +19,6 @@ using nlohmann::json;
 namespace {
 
 const std::string status_path = "/api/system/get_status.php";
-const std::string abc_digest = "sha-256=:ungWv48Bz+pBQUDeXa4iI7ADYaOWF3qctBD/YfIAFa0=:";
 
 std::string body_of(const std::string &reply) { return reply.substr(reply.find("\r\n\r\n") + 4); }
 
@@ -29,10 +28,7 @@ class AdminProcess : public testing::Test {
 protected:
     AdminProcess()
     {
-        const finished_process done = run_program(
-            {"add-account", "--data", data, "--email", "ann@example.org", "--password-file", "-"},
-            "secret\n");
-        EXPECT_EQ(done.exit_code, 0) << done.errors;
+        add_ann(data);
         server.emplace(data, std::vector<std::string>{"--admin", "127.0.0.1:0"});
         token = log_in(server->http_port());
     }

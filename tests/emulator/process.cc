@@ -158,6 +158,16 @@ finished_process run_program(const std::vector<std::string> &arguments, const st
     return {exit_code, emulator::read_file(out, 1 << 20), emulator::read_file(err, 1 << 20)};
 }
 
+void add_ann(const std::string &data, const std::vector<std::string> &options)
+{
+    std::vector<std::string> arguments = {"add-account",     "--data",          data, "--email",
+                                          "ann@example.org", "--password-file", "-"};
+    arguments.insert(arguments.end(), options.begin(), options.end());
+    const finished_process done = run_program(arguments, "secret\n");
+    if (done.exit_code != 0)
+        throw std::runtime_error(done.errors);
+}
+
 std::string log_in(std::uint16_t port)
 {
     const std::string signature =

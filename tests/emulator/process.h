@@ -11,6 +11,9 @@
 
 #include "files.h"
 
+/** The Content-Digest of the bytes "abc". */
+inline const std::string abc_digest = "sha-256=:ungWv48Bz+pBQUDeXa4iI7ADYaOWF3qctBD/YfIAFa0=:";
+
 /** A server process on ports of the kernel's choice. It has told that it listens when the
  * constructor returns, and is killed at the end unless it was stopped. */
 class server_process {
@@ -69,6 +72,10 @@ struct finished_process {
 /** Runs the program to its end with the text as its standard input. */
 finished_process run_program(const std::vector<std::string> &arguments,
                              const std::string &input = {});
+
+/** Adds ann@example.org, whose password is "secret", with further options of the command. Throws
+ * what the program complains of. */
+void add_ann(const std::string &data, const std::vector<std::string> &options = {});
 
 /** A session of ann@example.org, whose password is "secret". */
 std::string log_in(std::uint16_t port);

@@ -37,14 +37,6 @@ const std::string system_status_path = "/api/system/get_status.php";
 
 class Process : public testing::Test {
 protected:
-    void add_ann()
-    {
-        const finished_process done = run_program(
-            {"add-account", "--data", data, "--email", "ann@example.org", "--password-file", "-"},
-            "secret\n");
-        ASSERT_EQ(done.exit_code, 0) << done.errors;
-    }
-
     static std::string device_status(const server_process &server, const std::string &token)
     {
         return get(server.http_port(),
@@ -142,7 +134,7 @@ TEST_F(Process, EndsCleanlyOnEitherSignal)
 
 TEST_F(Process, KeepsItsSessionsOverARestart)
 {
-    add_ann();
+    add_ann(data);
     std::string token;
     {
         server_process server(data);
@@ -157,7 +149,7 @@ TEST_F(Process, KeepsItsSessionsOverARestart)
 
 TEST_F(Process, KeepsWhatItAcknowledgedOverAKill)
 {
-    add_ann();
+    add_ann(data);
     for (int round = 0; round < 5; ++round) {
         std::string token;
         {
@@ -175,14 +167,14 @@ TEST_F(Process, TakesAnAccountThatIsMadeWhileItServes)
 {
     const server_process server(data);
 
-    add_ann();
+    add_ann(data);
 
     EXPECT_EQ(log_in(server.http_port()).size(), 64u);
 }
 
 TEST_F(Process, TakesAnApplicationThatIsRegisteredWhileItServes)
 {
-    add_ann();
+    add_ann(data);
     const server_process server(data);
     ASSERT_EQ(
         run_program({"add-application", "--data", data, "--id", "42", "--key-file", "-"}, "changed")
@@ -194,7 +186,7 @@ TEST_F(Process, TakesAnApplicationThatIsRegisteredWhileItServes)
 
 TEST_F(Process, SessionLifetimeIsAnOption)
 {
-    add_ann();
+    add_ann(data);
     const std::int64_t before = std::time(nullptr);
     const server_process server(data, {"--session-lifetime", "7000"});
     log_in(server.http_port());

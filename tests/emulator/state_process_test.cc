@@ -24,18 +24,9 @@ class StateProcess : public testing::Test {
 protected:
     StateProcess()
     {
-        add("ann@example.org", {"--profile", "first_name=Ann", "--bandwidth-limit", "4000000"});
+        add_ann(data, {"--profile", "first_name=Ann", "--bandwidth-limit", "4000000"});
         fs::create_directories(source / "photos");
         emulator::write_file(source / "photos/a.jpg", picture, 0600);
-    }
-
-    void add(const std::string &email, const std::vector<std::string> &options = {})
-    {
-        std::vector<std::string> arguments{"add-account", "--data",          data, "--email",
-                                           email,         "--password-file", "-"};
-        arguments.insert(arguments.end(), options.begin(), options.end());
-        const finished_process done = run_program(arguments, "secret\n");
-        EXPECT_EQ(done.exit_code, 0) << done.errors;
     }
 
     finished_process put(const std::string &path, const std::string &from,

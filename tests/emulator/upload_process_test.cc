@@ -24,17 +24,11 @@ std::string hash_in_hex(const std::string &bytes)
     return sum.finish_hex();
 }
 
-// The service's own form of the digest is base64: this one alone is needed here.
-const std::string hash_of_abc = "sha-256=:ungWv48Bz+pBQUDeXa4iI7ADYaOWF3qctBD/YfIAFa0=:";
-
 class UploadProcess : public testing::Test {
 protected:
     UploadProcess()
     {
-        const finished_process done = run_program(
-            {"add-account", "--data", data, "--email", "ann@example.org", "--password-file", "-"},
-            "secret\n");
-        EXPECT_EQ(done.exit_code, 0) << done.errors;
+        add_ann(data);
         server.emplace(data);
         token = log_in(server->http_port());
     }
@@ -48,7 +42,7 @@ protected:
     std::string post_abc(const std::string &name, const std::string &more = {}) const
     {
         return post("Content-Disposition: attachment; filename=\"" + name + "\"\r\n" +
-                    "Content-Digest: " + hash_of_abc + "\r\nContent-Length: 3\r\n" + more);
+                    "Content-Digest: " + abc_digest + "\r\nContent-Length: 3\r\n" + more);
     }
 
     std::string listing() const
@@ -118,7 +112,7 @@ TEST_F(UploadProcess, ComesInChunksByteByByte)
 {
     socket_client client(server->http_port());
     const std::string request =
-        post("Content-Disposition: attachment; filename=a.txt\r\nRepr-Digest: " + hash_of_abc +
+        post("Content-Disposition: attachment; filename=a.txt\r\nRepr-Digest: " + abc_digest +
              "\r\nTransfer-Encoding: chunked\r\n") +
         "1\r\na\r\n2\r\nbc\r\n0\r\n\r\n";
 

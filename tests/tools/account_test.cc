@@ -20,15 +20,6 @@ class Account : public emulator_account {
 protected:
     Account() { sign_in(); }
 
-    words names_in(const std::string &path) const
-    {
-        const json listing = result_of({"ls", path});
-        words names;
-        for (const json &each : listing.at("entries"))
-            names.push_back(each.at("name"));
-        return names;
-    }
-
     std::string key_of(const std::string &path) const
     {
         return result_of({"stat", path}).at("key");
@@ -62,7 +53,7 @@ TEST_F(Account, IsListedInFullBeyondOneChunk)
     emulator_command(
         {"put-content", "--account", account_email, "--path", "/many", "--from", many});
 
-    const words names = names_in("/many");
+    const words names = listed_names("/many");
 
     ASSERT_EQ(names.size(), 205U);
     EXPECT_EQ(names.front(), "1001");
@@ -106,7 +97,7 @@ TEST_F(Account, TakesNamesOfEveryCharacter)
         EXPECT_EQ(result_of({"stat", path}).at("name"), name);
         result_of({"rm", path});
     }
-    EXPECT_THAT(names_in("/"), ElementsAre());
+    EXPECT_THAT(listed_names("/"), ElementsAre());
 }
 
 TEST_F(Account, GetsAFolderOnceUnlessAsked)
@@ -120,7 +111,7 @@ TEST_F(Account, GetsAFolderOnceUnlessAsked)
     result_of({"create", "/f"});
     error_of({"mkdir", "-p", "/f"}, 3);
     error_of({"mkdir", "-p", "/f/g"}, 3);
-    EXPECT_THAT(names_in("/a"), ElementsAre("b"));
+    EXPECT_THAT(listed_names("/a"), ElementsAre("b"));
 }
 
 TEST_F(Account, GetsAnEmptyFileOnce)
@@ -142,9 +133,9 @@ TEST_F(Account, LosesAFolderOnlyOnPurpose)
     result_of({"mkdir", "-p", "/a/b"});
 
     EXPECT_THAT(std::string(error_of({"rm", "/a"}, 2).at("advice")), HasSubstr("--recursive"));
-    EXPECT_THAT(names_in("/"), ElementsAre("a"));
+    EXPECT_THAT(listed_names("/"), ElementsAre("a"));
     result_of({"rm", "-r", "/a"});
-    EXPECT_THAT(names_in("/"), ElementsAre());
+    EXPECT_THAT(listed_names("/"), ElementsAre());
 }
 
 TEST_F(Account, MovesIntoAFolderOrToANewName)
@@ -161,8 +152,8 @@ TEST_F(Account, MovesIntoAFolderOrToANewName)
     EXPECT_EQ(result_of({"mv", "key:" + key, "/"}).at("path"), "/h");
     EXPECT_EQ(result_of({"mv", "/e", "/d/"}).at("path"), "/d/e");
     EXPECT_EQ(result_of({"mv", "/d", "/c/"}).at("path"), "/c/");
-    EXPECT_THAT(names_in("/c"), ElementsAre("e"));
-    EXPECT_THAT(names_in("/"), ElementsAre("c", "h"));
+    EXPECT_THAT(listed_names("/c"), ElementsAre("e"));
+    EXPECT_THAT(listed_names("/"), ElementsAre("c", "h"));
 }
 
 TEST_F(Account, NeverMovesOverWhatIsThere)
@@ -178,7 +169,7 @@ TEST_F(Account, NeverMovesOverWhatIsThere)
     error_of({"mv", "/f", "/x/y"}, 3);
     EXPECT_EQ(error_of({"mv", "/f", "/d"}, 3).at("code"), 115);
     EXPECT_EQ(error_of({"mv", "/d", "/d"}, 3).at("code"), 120);
-    EXPECT_THAT(names_in("/"), ElementsAre("d", "f"));
+    EXPECT_THAT(listed_names("/"), ElementsAre("d", "f"));
 }
 
 TEST_F(Account, CopiesAFolderOnlyOnPurpose)
@@ -189,10 +180,10 @@ TEST_F(Account, CopiesAFolderOnlyOnPurpose)
     error_of({"cp", "/a", "/c"}, 2);
     const json copy = result_of({"cp", "-r", "/a", "/c"});
     EXPECT_EQ(copy.at("key"), key_of("/c"));
-    EXPECT_THAT(names_in("/c"), ElementsAre("b"));
+    EXPECT_THAT(listed_names("/c"), ElementsAre("b"));
     EXPECT_EQ(result_of({"cp", "/f", "/c"}).at("path"), "/c/f");
     EXPECT_EQ(result_of({"cp", "/f", "/c/g"}).at("path"), "/c/g");
-    EXPECT_THAT(names_in("/c"), ElementsAre("b", "f", "g"));
+    EXPECT_THAT(listed_names("/c"), ElementsAre("b", "f", "g"));
     error_of({"cp", "/f", "/c/g"}, 3);
 }
 

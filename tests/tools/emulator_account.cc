@@ -79,6 +79,15 @@ json emulator_account::result_of(std::vector<std::string> arguments) const
     return json::parse(ended.out, nullptr, false);
 }
 
+std::vector<std::string> emulator_account::listed_names(const std::string &path) const
+{
+    const json listing = result_of({"ls", path});
+    std::vector<std::string> names;
+    for (const json &each : listing.at("entries"))
+        names.push_back(each.at("name"));
+    return names;
+}
+
 json emulator_account::error_of(std::vector<std::string> arguments, int exit_code) const
 {
     arguments.emplace_back("--json");

@@ -40,6 +40,9 @@ protected:
     /** Runs a command that must succeed, and gives its result in JSON. */
     nlohmann::json result_of(std::vector<std::string> arguments) const;
 
+    /** The names that a folder of the account holds, in the order of its listing. */
+    std::vector<std::string> listed_names(const std::string &path) const;
+
     /** Runs a command that must fail with this exit code, and gives the error in JSON. */
     nlohmann::json error_of(std::vector<std::string> arguments, int exit_code) const;
 

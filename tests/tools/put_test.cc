@@ -17,15 +17,6 @@ using words = std::vector<std::string>;
 
 class Put : public transfer_account {
 protected:
-    std::vector<std::string> names(const std::string &path) const
-    {
-        std::vector<std::string> found;
-        const nlohmann::json listing = result_of({"ls", path});
-        for (const auto &each : listing.at("entries"))
-            found.push_back(each.at("name"));
-        return found;
-    }
-
     /** Uploading writes to standard error what a person should know, with --json too. */
     nlohmann::json error_in(words arguments, int exit_code) const
     {
@@ -66,7 +57,7 @@ TEST_F(Put, SendsNothingUnencryptedToAnotherMachine)
 
     EXPECT_EQ(ended.exit_status, 2) << ended.err;
     EXPECT_THAT(ended.err, HasSubstr("198.51.100.1"));
-    EXPECT_EQ(names("/"), words{});
+    EXPECT_EQ(listed_names("/"), words{});
 }
 
 TEST_F(Put, TakesAFolderOrANewNameAsDestination)
@@ -78,7 +69,7 @@ TEST_F(Put, TakesAFolderOrANewNameAsDestination)
     done({"put", file, "/photos/b.jpg"});
     done({"put", file, file, local("c.jpg", "third"), "/photos/"});
 
-    EXPECT_THAT(names("/photos"), ElementsAre("a.jpg", "b.jpg", "c.jpg"));
+    EXPECT_THAT(listed_names("/photos"), ElementsAre("a.jpg", "b.jpg", "c.jpg"));
     EXPECT_EQ(stored_contents().size(), 2u) << "the same content is stored once";
 }
 
@@ -94,7 +85,7 @@ TEST_F(Put, SendsANewRevisionOfAFileThatIsThere)
     EXPECT_EQ(after.at("key"), before.at("key"));
     EXPECT_GT(after.at("revision"), before.at("revision"));
     EXPECT_EQ(after.at("hash"), sha256_of("newer"));
-    EXPECT_THAT(names("/"), ElementsAre("a.txt"));
+    EXPECT_THAT(listed_names("/"), ElementsAre("a.txt"));
 }
 
 TEST_F(Put, SendsNothingWhenTheSameIsThere)
@@ -139,7 +130,7 @@ TEST_F(Put, SendsAFolderWithAllThatItHolds)
     const outcome ended = done({"put", "-r", tree});
 
     EXPECT_EQ(ended.out, "Uploaded 2 files (2 B)\n");
-    EXPECT_THAT(names("/tree"), ElementsAre("deep", "empty", "a.txt"));
+    EXPECT_THAT(listed_names("/tree"), ElementsAre("deep", "empty", "a.txt"));
     EXPECT_EQ(remote_sha256("/tree/deep/er/b.txt"), sha256_of("b"));
     EXPECT_EQ(home.run({"put", tree}).exit_status, 2) << "without -r";
 }
@@ -169,7 +160,7 @@ TEST_F(Put, GivesAFolderANewName)
 
     done({"put", "-r", home.folder().path_of("sources/tree/"), "/other"});
 
-    EXPECT_THAT(names("/other"), ElementsAre("a.txt"));
+    EXPECT_THAT(listed_names("/other"), ElementsAre("a.txt"));
 }
 
 TEST_F(Put, GoesOnWhenOneOfManyFails)
@@ -186,7 +177,7 @@ TEST_F(Put, GoesOnWhenOneOfManyFails)
     EXPECT_THAT(ended.err, HasSubstr("bad\\u{1}name failed: 106"));
     EXPECT_THAT(ended.err, HasSubstr("link is a link, which is left out"));
     EXPECT_THAT(ended.err, HasSubstr("uploaded 2 files (2 B), but 2 files failed ("));
-    EXPECT_THAT(names("/tree"), ElementsAre("a.txt", "c.txt"));
+    EXPECT_THAT(listed_names("/tree"), ElementsAre("a.txt", "c.txt"));
 }
 
 TEST_F(Put, RefusesWhatCannotBeUploaded)
@@ -204,7 +195,7 @@ TEST_F(Put, RefusesWhatCannotBeUploaded)
               "refused");
     EXPECT_EQ(error_in({"put", local("folder", "x")}, 3).at("code"), 115)
         << "a file cannot take the name of a folder";
-    EXPECT_THAT(names("/"), ElementsAre("folder", "a.txt"));
+    EXPECT_THAT(listed_names("/"), ElementsAre("folder", "a.txt"));
 }
 
 TEST_F(Put, IsRefusedWithoutRoom)
