@@ -11,8 +11,7 @@
 
 #include "api/account_operations.h"
 #include "api/deliberate_leak.h"
-#include "api/operations.h"
-#include "api/taken_results.h"
+#include "api/sample_calls.h"
 #include "support/hook_recorder.h"
 #include "support/log_capture.h"
 
@@ -62,66 +61,19 @@ struct reading_operation {
     std::string accepted;
 };
 
-call_outcome system_limits_call()
+call_outcome whole_login_token_call()
 {
-    auto *limits = rubbish<system_limits>();
-    char *message = rubbish<char>();
-    int32_t status = get_system_limits(&limits, &message);
-    return outcome_of(status, message, taken_record(limits));
-}
-
-call_outcome system_status_call()
-{
-    auto *found = rubbish<system_status>();
-    char *message = rubbish<char>();
-    int32_t status = get_system_status(&found, &message);
-    return outcome_of(status, message, taken_record(found));
-}
-
-call_outcome device_status_call()
-{
-    uint64_t revision = 77;
-    int32_t jobs = 77;
-    char *message = rubbish<char>();
-    int32_t status = get_device_status("token", 12, &revision, &jobs, &message);
-    return outcome_of(status, message,
-                      taken_number("revision", revision) + taken_number(" jobs", jobs));
-}
-
-call_outcome session_token_call()
-{
-    char *token = rubbish<char>();
-    int32_t status = get_session_token("a", "b", nullptr, "c", "d", &token);
-    return outcome_of(status, token, "");
-}
-
-call_outcome login_token_call()
-{
-    deliberate_leak of_the_pkey_of_a_malformed_reply;
+    deliberate_leak of_the_slot_of_a_malformed_reply;
     pkey_slot pkey;
-    char *token = rubbish<char>();
-    int32_t status = get_login_token("a", "b", "c", "d", pkey.place(), &token);
-    std::string text = status == QM_MALFORMED_REPLY ? "gone" : pkey.take().value_or("NULL");
-    return outcome_of(status, token, "pkey=" + text);
-}
-
-call_outcome renewal_call()
-{
-    char *token = rubbish<char>();
-    int32_t status = renew_session_token("token", &token);
-    return outcome_of(status, token, "");
+    return login_token_call(pkey);
 }
 
 std::vector<reading_operation> reading_operations()
 {
-    std::vector<reading_operation> all = {
-        {"get_system_limits", system_limits_call, operations[0].success()},
-        {"get_system_status", system_status_call, operations[1].success()},
-        {"get_device_status", device_status_call, operations[2].success()},
-        {"get_session_token", session_token_call, operations[3].success()},
-        {"get_login_token", login_token_call, operations[4].success()},
-        {"renew_session_token", renewal_call, operations[5].success()},
-    };
+    const operation &login = operations[4];
+    std::vector<reading_operation> all = {{login.name, whole_login_token_call, login.success()}};
+    for (const sample_call &each : sample_calls)
+        all.push_back({each.of.name, each.call, each.of.success()});
     for (const account_operation &each : account_operations)
         all.push_back({each.name, each.call, each.accepted_reply()});
     return all;

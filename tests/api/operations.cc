@@ -7,15 +7,6 @@
 
 namespace quillmere_test {
 
-std::optional<std::string> taken(char *text)
-{
-    std::optional<std::string> copy;
-    if (text)
-        copy = text;
-    api_free(text);
-    return copy;
-}
-
 pkey_slot::pkey_slot() : place_(static_cast<char **>(std::malloc(sizeof(char *))))
 {
     *place_ = nullptr;

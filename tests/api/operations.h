@@ -6,6 +6,7 @@
 #include <string>
 
 #include "quillmere.h"
+#include "support/taken_text.h"
 
 namespace quillmere_test {
 
@@ -42,9 +43,6 @@ struct operation {
 void PrintTo(const operation &each, std::ostream *out);
 
 extern const operation operations[6];
-
-// Takes the text that an operation has handed out.
-std::optional<std::string> taken(char *text);
 
 // A place for get_login_token's pkey, which the library frees when the reply is malformed.
 class pkey_slot {

@@ -1,6 +1,7 @@
 #include "faults/ways.h"
 
 #include "interpose/heap.h"
+#include "support/taken_text.h"
 #include "support/thread_log.h"
 
 namespace quillmere_test {
@@ -45,15 +46,6 @@ void check_exchange(const outcome_of_call &outcome, const expectation &expected,
 
 std::string nothing_before(const std::string &) { return ""; }
 std::string nothing_after(const expectation &, bool) { return ""; }
-
-std::optional<std::string> taken(char *text)
-{
-    std::optional<std::string> copy;
-    if (text)
-        copy = text;
-    api_free(text);
-    return copy;
-}
 
 // An operation that creates something, whose reply may be lost when the work is done.
 outcome_of_call operation(const std::string &)

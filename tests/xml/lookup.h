@@ -5,6 +5,7 @@
 #include <string>
 
 #include "quillmere.h"
+#include "support/taken_text.h"
 
 namespace quillmere_test {
 
@@ -12,15 +13,6 @@ struct looked_up {
     std::optional<std::string> value; // none for NULL
     int32_t parse_failed;
 };
-
-inline std::optional<std::string> taken(char *text)
-{
-    std::optional<std::string> copy;
-    if (text)
-        copy = text;
-    api_free(text);
-    return copy;
-}
 
 // The flag holds rubbish before the call, so that a test sees whether it is set.
 inline looked_up look_up(const std::string &xml, const char *sought)
