@@ -1,5 +1,8 @@
 #include "xml/document.h"
 
+#include <climits>
+#include <cstring>
+
 #include <sys/random.h>
 
 namespace quillmere {
@@ -28,6 +31,41 @@ unsigned long hash_salt()
     return salt;
 }
 
+// expat copies what it is given. So a long document goes to it in pieces, for all of which one
+// buffer of 64 KiB is enough: expat wants room for a piece and for 1 KiB before it.
+constexpr size_t longest_piece = 60 * 1024;
+
+bool has_markup(const char *xml, size_t length, char kind)
+{
+    const char *end = xml + length;
+    for (const void *found = std::memchr(xml, kind, length); found;) {
+        const char *at = static_cast<const char *>(found);
+        if (at > xml && at[-1] == '<')
+            return true;
+        found = std::memchr(at + 1, kind, static_cast<size_t>(end - at - 1));
+    }
+    return false;
+}
+
+// Whether there is nothing but tags and text behind a declaration. Then nothing goes on past the
+// end of a tag, where another begins, so that a cut there changes nothing that expat reports. What
+// can go on, such as a comment, expat would also read again for every piece of it.
+bool may_be_cut(const char *xml, size_t length)
+{
+    constexpr size_t declaration = 2; // "<?"
+    return length > longest_piece && length <= INT_MAX && !has_markup(xml, length, '!') &&
+           !has_markup(xml + declaration, length - declaration, '?');
+}
+
+// Of the next piece: up to the last place to cut, or all the rest.
+size_t piece_length(const char *xml, size_t left)
+{
+    for (size_t cut = longest_piece; left > longest_piece && cut > 1; --cut)
+        if (xml[cut] == '<' && xml[cut - 1] == '>')
+            return cut;
+    return left;
+}
+
 } // namespace
 
 xml_parser new_document_parser(void *state, const document_handlers &handlers)
@@ -47,7 +85,17 @@ XML_Status parse_document(const xml_parser &parser, const char *xml, uint64_t le
 {
     if (!parser)
         return XML_STATUS_ERROR;
-    return XML_Parse(parser.get(), xml, static_cast<int>(static_cast<uint32_t>(length)), XML_TRUE);
+    size_t left = static_cast<uint32_t>(length);
+    const bool in_pieces = may_be_cut(xml, left);
+    while (true) {
+        const size_t piece = in_pieces ? piece_length(xml, left) : left;
+        const bool last = piece == left;
+        XML_Status status = XML_Parse(parser.get(), xml, static_cast<int>(piece), last);
+        if (last || status != XML_STATUS_OK)
+            return status;
+        xml += piece;
+        left -= piece;
+    }
 }
 
 } // namespace quillmere
