@@ -31,8 +31,10 @@ unsigned long hash_salt()
     return salt;
 }
 
-// expat copies what it is given. So a long document goes to it in pieces, for all of which one
-// buffer of 64 KiB is enough: expat wants room for a piece and for 1 KiB before it.
+// expat copies what it is given. So a very long document goes to it in pieces, for all of which
+// one buffer of 64 KiB is enough: expat wants room for a piece and for 1 KiB before it. Behind each
+// piece it counts the lines, which for shorter ones would cost more than the copy.
+constexpr size_t longest_whole = 1024 * 1024;
 constexpr size_t longest_piece = 60 * 1024;
 
 bool has_markup(const char *xml, size_t length, char kind)
@@ -53,7 +55,7 @@ bool has_markup(const char *xml, size_t length, char kind)
 bool may_be_cut(const char *xml, size_t length)
 {
     constexpr size_t declaration = 2; // "<?"
-    return length > longest_piece && length <= INT_MAX && !has_markup(xml, length, '!') &&
+    return length > longest_whole && length <= INT_MAX && !has_markup(xml, length, '!') &&
            !has_markup(xml + declaration, length - declaration, '?');
 }
 
