@@ -37,7 +37,7 @@ void call_user_info()
     std::free(message);
 }
 
-void call_folder_content()
+file_list *listed_files()
 {
     char *message = nullptr;
     folder_list *folders = nullptr;
@@ -50,9 +50,15 @@ void call_folder_content()
                     "get_folder_content");
     if (folders)
         delete_all_folder_list(&folders);
+    std::free(message);
+    return files;
+}
+
+void call_folder_content()
+{
+    file_list *files = listed_files();
     if (files)
         delete_all_file_list(&files);
-    std::free(message);
 }
 
 void call_device_changes()

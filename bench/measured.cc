@@ -23,6 +23,18 @@ double median(std::vector<double> values)
     return *middle;
 }
 
+// In microseconds a call, where that has a sense.
+void print_row(const pairing &pair, double own, double reference, double median_ratio)
+{
+    std::printf("| %s | %.2f | %.2f | %.3f | %.3f | ", pair.what.c_str(), own * 1e6,
+                reference * 1e6, own / reference, median_ratio);
+    if (pair.at_most > no_figure)
+        std::printf("%.2f |\n", pair.at_most);
+    else
+        std::printf("- |\n");
+    std::fflush(stdout);
+}
+
 } // namespace
 
 double cpu_seconds()
@@ -36,14 +48,6 @@ void print_heading()
 {
     std::printf("| what | own, us | reference, us | ratio of the best | median ratio | asked |\n"
                 "| --- | --: | --: | --: | --: | --: |\n");
-}
-
-void print_row(const std::string &what, double at_most, double own, double reference,
-               double median_ratio)
-{
-    std::printf("| %s | %.2f | %.2f | %.3f | %.3f | %.2f |\n", what.c_str(), own * 1e6,
-                reference * 1e6, own / reference, median_ratio, at_most);
-    std::fflush(stdout);
 }
 
 void measure(const pairing &pair, unsigned rounds)
@@ -62,7 +66,7 @@ void measure(const pairing &pair, unsigned rounds)
             own.push_back(seconds_of(pair.own, pair.calls));
         ratios.push_back(own.back() / reference.back());
     }
-    print_row(pair.what, pair.at_most, *std::min_element(own.begin(), own.end()),
+    print_row(pair, *std::min_element(own.begin(), own.end()),
               *std::min_element(reference.begin(), reference.end()), median(ratios));
 }
 

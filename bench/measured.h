@@ -10,6 +10,8 @@ namespace quillmere_bench {
 // Processor time of the whole process, all its threads included.
 double cpu_seconds();
 
+constexpr double no_figure = 0; // asked of a row that explains others
+
 struct pairing {
     std::string what;
     double at_most; // the ratio that is asked for
@@ -20,11 +22,8 @@ struct pairing {
 
 void print_heading();
 
-// Measures in so many rounds and prints a row of the table.
-void measure(const pairing &pair, unsigned rounds = 15);
-
-// A row whose ratios were measured elsewhere. Per call, in microseconds, where it has a sense.
-void print_row(const std::string &what, double at_most, double own, double reference,
-               double median_ratio);
+// Measures in so many rounds and prints a row of the table. Many short ones find a quiet moment of
+// a machine that does other things, too.
+void measure(const pairing &pair, unsigned rounds = 45);
 
 } // namespace quillmere_bench

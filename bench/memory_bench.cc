@@ -15,6 +15,7 @@
 #include <unistd.h>
 
 #include "calls.h"
+#include "demanded.h"
 #include "measured.h"
 #include "quillmere.h"
 #include "references.h"
@@ -63,18 +64,35 @@ void measure_operation(const std::string &what, double at_most, const std::strin
     measure({what, at_most, operation, deliver_and_parse, calls});
 }
 
+// What of an operation is the interface's demand alone, beside the same delivery and pass.
+void measure_demand(const std::string &what, const std::string &reply, void (*demand)(),
+                    unsigned calls)
+{
+    delivered = &reply;
+    measure({what, no_figure, demand, deliver_and_parse, calls});
+}
+
+void log_delivered() { log_folder_info(delivered->c_str()); }
+
 void measure_operations()
 {
     measure_operation("`get_folder_info` from memory, 24 values", 1.15, folder_record(),
-                      call_folder_info, 2000);
+                      call_folder_info, 500);
+    measure_demand("of that, the record and its values", folder_record(), make_folder_record, 500);
+    measure_demand("of that, the log lines", folder_record(), log_delivered, 500);
     measure_operation("`get_user_info` from memory, 39 values", 1.15, user_record(), call_user_info,
-                      2000);
+                      500);
+    measure_demand("of that, the record and its values", user_record(), make_user_record, 500);
     measure_operation("`get_folder_content` from memory, 100 entries", 1.45, listing(100),
-                      call_folder_content, 100);
+                      call_folder_content, 30);
     measure_operation("`get_folder_content` from memory, 1,000 entries", 1.45, listing(1000),
-                      call_folder_content, 10);
+                      call_folder_content, 4);
+    measure_demand("of that, the list, its records and their values", listing(1000), make_listing,
+                   4);
     measure_operation("`get_device_changes` from memory, 500 entries", 1.50, change_feed(500),
-                      call_device_changes, 20);
+                      call_device_changes, 8);
+    measure_demand("of that, the list, its records and their values", change_feed(500),
+                   make_change_list, 8);
 }
 
 // Per entry, against a listing of a thousand.
@@ -82,13 +100,18 @@ void measure_growth()
 {
     const std::string many = listing(100000);
     const std::string few = listing(1000);
-    auto list = [](const std::string &reply, int times) {
+    auto repeated = [](const std::string &reply, int times, void (*work)()) {
         delivered = &reply;
         for (int time = 0; time < times; ++time)
-            call_folder_content();
+            work();
     };
-    measure({"100,000 entries beside 100 times 1,000", 1.10, [&] { list(many, 1); },
-             [&] { list(few, 100); }},
+    measure({"100,000 entries beside 100 times 1,000", 1.10,
+             [&] { repeated(many, 1, call_folder_content); },
+             [&] { repeated(few, 100, call_folder_content); }},
+            15);
+    measure({"the same of delivery and expat alone", no_figure,
+             [&] { repeated(many, 1, deliver_and_parse); },
+             [&] { repeated(few, 100, deliver_and_parse); }},
             15);
 }
 
@@ -116,7 +139,7 @@ void measure_encoding(const std::string &what, const std::string &text)
                      string_append(buffer, escaped.get());
                  });
              },
-             20000});
+             5000});
 }
 
 void measure_encoder()
@@ -136,6 +159,18 @@ size_t status_kilobytes(const std::string &field)
     return 0;
 }
 
+void forget_peak() { std::ofstream("/proc/self/clear_refs") << 5; }
+
+// What some work holds at its peak, in multiples of the reply.
+double held_at_peak(const std::function<void()> &work)
+{
+    forget_peak();
+    auto before = static_cast<double>(status_kilobytes("VmRSS:"));
+    work();
+    double taken = static_cast<double>(status_kilobytes("VmHWM:")) - before;
+    return taken * 1024 / static_cast<double>(delivered->size());
+}
+
 // In a process of its own: what others have freed would be used again here.
 void measure_memory()
 {
@@ -147,14 +182,13 @@ void measure_memory()
     }
     const std::string reply = listing(100000);
     delivered = &reply;
-    std::ofstream("/proc/self/clear_refs") << 5; // the peak begins anew
-    double before = static_cast<double>(status_kilobytes("VmRSS:"));
-    call_folder_content();
-    double taken = static_cast<double>(status_kilobytes("VmHWM:")) - before;
-    double size = static_cast<double>(reply.size()) / 1024;
+    file_list *files = nullptr;
+    double of_call = held_at_peak([&] { files = listed_files(); }) - 1; // the reply itself
+    double of_blocks = held_at_peak([&] { copy_of(files); });
     std::printf("\nA listing of 100,000 entries, %.1f MiB: at its peak the call holds %.2f times "
-                "that beyond the reply itself (asked: 1.40).\n",
-                size / 1024, taken / size - 1);
+                "that beyond the reply itself (asked: 1.40).\nThe same list, its records and their "
+                "values alone, made anew: %.2f times.\n",
+                static_cast<double>(reply.size()) / (1024 * 1024), of_call, of_blocks);
     std::fflush(nullptr);
     ::_exit(0);
 }

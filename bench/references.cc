@@ -54,4 +54,12 @@ void raw_exchange(const std::string &url, const std::string &ca_path)
     perform(new_raw_handle(url, ca_path).get());
 }
 
+void unverified_exchange(const std::string &url)
+{
+    raw_handle handle = new_raw_handle(url, "");
+    curl_easy_setopt(handle.get(), CURLOPT_CAINFO, nullptr);
+    curl_easy_setopt(handle.get(), CURLOPT_SSL_VERIFYPEER, 0L);
+    perform(handle.get());
+}
+
 } // namespace quillmere_bench

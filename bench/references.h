@@ -25,4 +25,7 @@ void perform(CURL *handle);
 
 void raw_exchange(const std::string &url, const std::string &ca_path); // on a handle of its own
 
+// The same without a certificate to read or to verify against.
+void unverified_exchange(const std::string &url);
+
 } // namespace quillmere_bench

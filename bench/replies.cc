@@ -1,5 +1,7 @@
 #include "replies.h"
 
+#include <cstdio>
+
 namespace quillmere_bench {
 namespace {
 
@@ -65,15 +67,20 @@ constexpr const char *twitter_elements[] = {
     "twitter_id", "date_created", "screen_name", "name", "i18n",
 };
 
-std::string file_entry(const std::string &number)
+// 608 bytes in 18 elements.
+std::string file_entry(unsigned number)
 {
-    return "<file><quickkey>k" + number + "</quickkey><filename>file " + number +
-           ".txt</filename><created>2026-01-01 00:00:00</created><downloads>0</downloads>"
-           "<desc></desc><tags>a,b</tags><size>4096</size><privacy>private</privacy>"
-           "<filetype>text</filetype><mimetype>text/plain</mimetype>"
+    char digits[16];
+    std::snprintf(digits, sizeof digits, "%06u", number);
+    const std::string six = digits;
+    return "<file><quickkey>k4x9w2m7q" + six + "</quickkey><filename>pictures of the summer, " +
+           six +
+           ".jpeg</filename><created>2026-01-01 00:00:00</created><downloads>0</downloads>"
+           "<desc>taken from the boat, at noon</desc><tags>summer,boat,2026</tags><size>4096</size>"
+           "<privacy>private</privacy><filetype>image</filetype><mimetype>image/jpeg</mimetype>"
            "<hash>e3b0c44298fc1c149afbf4c8996fb92427ae41e4649b934ca495991b7852b855</hash>"
            "<password_protected>no</password_protected><revision>" +
-           number +
+           six +
            "</revision><owner_name>Ada Lovelace</owner_name><flag>1</flag>"
            "<shared_by_user>0</shared_by_user><permissions>4</permissions></file>";
 }
@@ -95,7 +102,7 @@ std::string listing(unsigned entries)
 {
     std::string files;
     for (unsigned number = 0; number < entries; ++number)
-        files += file_entry(std::to_string(number));
+        files += file_entry(number);
     return success("<folder_content><chunk_size>1000</chunk_size><content_type>files</content_type>"
                    "<chunk_number>1</chunk_number><files>" +
                    files + "</files></folder_content>");

@@ -17,6 +17,7 @@
 #include "replies.h"
 #include "support/certificates.h"
 #include "support/library_fixture.h"
+#include "support/log_capture.h"
 #include "support/quick_server.h"
 #include "support/temporary_folder.h"
 #include "support/unread_log.h"
@@ -30,9 +31,19 @@ using quillmere_test::request;
 struct subject {
     const char *name;
     void (*call)();
-    const char *path;
     std::string reply;
+    std::string url = {};
 };
+
+// The one that it asks for, by its own log.
+std::string url_asked_by(void (*call)())
+{
+    quillmere_test::log_capture log;
+    call();
+    const std::string text = log.text();
+    size_t start = text.find("https:");
+    return text.substr(start, text.find('\n', start) - start);
+}
 
 class bench {
 public:
@@ -46,6 +57,8 @@ public:
     void run()
     {
         start(one_certificate_);
+        for (subject *each : {&folder, &user, &content, &changes})
+            each->url = url_asked_by(each->call);
         print_heading();
         measure_new_connections();
         measure_kept_connections();
@@ -64,32 +77,33 @@ private:
         ca_path_ = ca_path;
     }
 
-    std::string url_of(const subject &what) const { return base_ + what.path + "?version=2.15"; }
-
     void raw_call(const subject &what) const
     {
-        raw_exchange(url_of(what), ca_path_);
+        raw_exchange(what.url, ca_path_);
         parse_once(what.reply.data(), what.reply.size());
     }
 
     void measure_new_connections()
     {
         measure({"`get_folder_info`, new connection", 1.03, folder.call, [&] { raw_call(folder); },
-                 50});
-        measure({"`get_user_info`, new connection", 1.03, user.call, [&] { raw_call(user); }, 50});
+                 20});
+        measure({"`get_user_info`, new connection", 1.03, user.call, [&] { raw_call(user); }, 20});
         measure({"`get_folder_content`, 1,000 entries, new connection", 1.30, content.call,
-                 [&] { raw_call(content); }, 20});
+                 [&] { raw_call(content); }, 7});
         measure({"`get_device_changes`, 500 entries, new connection", 1.15, changes.call,
-                 [&] { raw_call(changes); }, 20});
+                 [&] { raw_call(changes); }, 7});
         measure({"`get_response_from_url`, new connection", 0.85, [&] { plain_exchange(); },
-                 [&] { raw_exchange(url_of(folder), ca_path_); }, 50});
+                 [&] { raw_exchange(folder.url, ca_path_); }, 20});
+        measure({"libcurl alone that verifies nothing, beside itself with one certificate",
+                 no_figure, [&] { unverified_exchange(folder.url); },
+                 [&] { raw_exchange(folder.url, ca_path_); }, 20});
     }
 
     void plain_exchange() const
     {
         char *response = nullptr;
         uint64_t length = 0;
-        if (get_response_from_url(url_of(folder).c_str(), nullptr, 0, &response, &length, 0) != 200)
+        if (get_response_from_url(folder.url.c_str(), nullptr, 0, &response, &length, 0) != 200)
             std::exit(1);
         std::free(response);
     }
@@ -97,14 +111,14 @@ private:
     void measure_bundle()
     {
         measure({"`get_folder_info`, full bundle, beside libcurl alone", 0.05, folder.call,
-                 [&] { raw_exchange(url_of(folder), ca_path_); }, 10});
+                 [&] { raw_exchange(folder.url, ca_path_); }, 10});
     }
 
     void measure_kept_connections()
     {
         set_connection_reuse(1);
-        measure_kept(folder, 1.10, 500);
-        measure_kept(content, 1.45, 20);
+        measure_kept(folder, 1.10, 200);
+        measure_kept(content, 1.45, 7);
         // A round begins with a new connection for either, since switching closes the kept one.
         auto hundreds = [&](int32_t kept) {
             set_connection_reuse(kept);
@@ -112,13 +126,14 @@ private:
                 folder.call();
         };
         measure({"200 times `get_folder_info`, kept connection beside new ones", 0.05,
-                 [&] { hundreds(1); }, [&] { hundreds(0); }});
+                 [&] { hundreds(1); }, [&] { hundreds(0); }},
+                15);
         set_connection_reuse(0);
     }
 
     void measure_kept(const subject &what, double at_most, unsigned calls) const
     {
-        raw_handle handle = new_raw_handle(url_of(what), ca_path_);
+        raw_handle handle = new_raw_handle(what.url, ca_path_);
         measure({std::string("`") + what.name + "`, kept connection", at_most, what.call,
                  [&] {
                      perform(handle.get());
@@ -129,20 +144,26 @@ private:
 
     void measure_threads()
     {
-        constexpr unsigned calls = 64;
-        auto on_threads = [&](unsigned count) {
-            std::vector<std::thread> threads;
-            for (unsigned number = 0; number < count; ++number)
-                threads.emplace_back([&, each = calls / count] {
-                    for (unsigned call = 0; call < each; ++call)
-                        folder.call();
-                });
-            for (std::thread &each : threads)
-                each.join();
-        };
-        for (unsigned count : {2u, 4u, 8u})
-            measure({"64 calls on " + std::to_string(count) + " threads beside 1", 1.05,
-                     [&, count] { on_threads(count); }, [&] { on_threads(1); }, 1});
+        for (unsigned count : {2u, 4u, 8u}) {
+            const std::string threads = std::to_string(count) + " threads beside 1";
+            measure({"64 calls on " + threads, 1.05, [&, count] { on_threads(count, folder.call); },
+                     [&] { on_threads(1, folder.call); }});
+            auto alone = [&] { raw_exchange(folder.url, ca_path_); };
+            measure({"64 times libcurl alone on " + threads, no_figure,
+                     [&, count] { on_threads(count, alone); }, [&] { on_threads(1, alone); }});
+        }
+    }
+
+    static void on_threads(unsigned count, const std::function<void()> &call)
+    {
+        std::vector<std::thread> threads;
+        for (unsigned number = 0; number < count; ++number)
+            threads.emplace_back([&, each = 64 / count] {
+                for (unsigned turn = 0; turn < each; ++turn)
+                    call();
+            });
+        for (std::thread &each : threads)
+            each.join();
     }
 
     std::string base_;
@@ -151,12 +172,10 @@ private:
     std::string ca_path_;
 
 public:
-    subject folder = {"get_folder_info", call_folder_info, get_folder_info_uri, folder_record()};
-    subject user = {"get_user_info", call_user_info, get_user_info_uri, user_record()};
-    subject content = {"get_folder_content", call_folder_content, get_folder_content_uri,
-                       listing(1000)};
-    subject changes = {"get_device_changes", call_device_changes, get_device_changes_uri,
-                       change_feed(500)};
+    subject folder = {"get_folder_info", call_folder_info, folder_record()};
+    subject user = {"get_user_info", call_user_info, user_record()};
+    subject content = {"get_folder_content", call_folder_content, listing(1000)};
+    subject changes = {"get_device_changes", call_device_changes, change_feed(500)};
 };
 
 std::string kept_reply(const std::string &body)
