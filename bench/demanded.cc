@@ -66,7 +66,7 @@ void make_change_list()
     delete_all_change_list(&changes);
 }
 
-void log_folder_info(const char *reply)
+void log_lines(const char *reply)
 {
     qm_printf("\nget_folder_info url text:\n%s\n",
               "https://127.0.0.1:65535/api/folder/get_info.php?session_token=token&"

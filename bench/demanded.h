@@ -13,8 +13,8 @@ void make_user_record();
 void make_listing();     // of 1,000 files
 void make_change_list(); // of 500 changes
 
-// The lines of one get_folder_info().
-void log_folder_info(const char *reply);
+// The lines of one operation: three, each written out at once.
+void log_lines(const char *reply);
 
 // A list of records of its own with the same texts.
 file_list *copy_of(const file_list *files);

@@ -25,18 +25,23 @@ void parse_once(const char *reply, size_t length)
     XML_ParserFree(parser);
 }
 
+void set_options(CURL *handle, const std::string &url, const std::string &ca_path)
+{
+    curl_easy_setopt(handle, CURLOPT_URL, url.c_str());
+    curl_easy_setopt(handle, CURLOPT_FOLLOWLOCATION, 1L);
+    curl_easy_setopt(handle, CURLOPT_NOSIGNAL, 1L);
+    curl_easy_setopt(handle, CURLOPT_TIMEOUT, 60L);
+    curl_easy_setopt(handle, CURLOPT_NOPROGRESS, 1L);
+    curl_easy_setopt(handle, CURLOPT_CAINFO, ca_path.c_str());
+    curl_easy_setopt(handle, CURLOPT_SSL_VERIFYPEER, 1L);
+    curl_easy_setopt(handle, CURLOPT_SSL_VERIFYHOST, 2L);
+    curl_easy_setopt(handle, CURLOPT_WRITEFUNCTION, discard);
+}
+
 raw_handle new_raw_handle(const std::string &url, const std::string &ca_path)
 {
     raw_handle handle(curl_easy_init());
-    curl_easy_setopt(handle.get(), CURLOPT_URL, url.c_str());
-    curl_easy_setopt(handle.get(), CURLOPT_FOLLOWLOCATION, 1L);
-    curl_easy_setopt(handle.get(), CURLOPT_NOSIGNAL, 1L);
-    curl_easy_setopt(handle.get(), CURLOPT_TIMEOUT, 60L);
-    curl_easy_setopt(handle.get(), CURLOPT_NOPROGRESS, 1L);
-    curl_easy_setopt(handle.get(), CURLOPT_CAINFO, ca_path.c_str());
-    curl_easy_setopt(handle.get(), CURLOPT_SSL_VERIFYPEER, 1L);
-    curl_easy_setopt(handle.get(), CURLOPT_SSL_VERIFYHOST, 2L);
-    curl_easy_setopt(handle.get(), CURLOPT_WRITEFUNCTION, discard);
+    set_options(handle.get(), url, ca_path);
     return handle;
 }
 

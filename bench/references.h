@@ -18,6 +18,7 @@ struct handle_cleaner {
 using raw_handle = std::unique_ptr<CURL, handle_cleaner>;
 
 // The options that the library sets, too. The body is discarded.
+void set_options(CURL *handle, const std::string &url, const std::string &ca_path);
 raw_handle new_raw_handle(const std::string &url, const std::string &ca_path);
 
 // Ends the program when the transfer fails.
