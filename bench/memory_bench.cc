@@ -107,11 +107,11 @@ void measure_operations()
 {
     const std::string thousand = listing(1000);
     measure_operation("`get_folder_info` from memory, 24 values", 1.15, folder_record(),
-                      call_folder_info, 500);
-    measure_demand(folder_record(), demand_of_folder, 500);
+                      call_folder_info, 1500);
+    measure_demand(folder_record(), demand_of_folder, 1500);
     measure_operation("`get_user_info` from memory, 39 values", 1.15, user_record(), call_user_info,
-                      500);
-    measure_demand(user_record(), demand_of_user, 500);
+                      1000);
+    measure_demand(user_record(), demand_of_user, 1500);
     measure_operation("`get_folder_content` from memory, 100 entries", 1.45, listing(100),
                       call_folder_content, 30);
     measure_operation("`get_folder_content` from memory, 1,000 entries", 1.45, thousand,

@@ -121,7 +121,7 @@ private:
     void measure_kept_connections()
     {
         set_connection_reuse(1);
-        measure_kept(folder, 1.10, 200);
+        measure_kept(folder, 1.10, 800);
         measure_kept(content, 1.45, 7);
         // A round begins with a new connection for either, since switching closes the kept one.
         auto hundreds = [&](int32_t kept) {
