@@ -58,6 +58,7 @@ void measure(const pairing &pair, unsigned rounds)
     pair.own(); // what is made once is made before
     pair.reference();
     for (unsigned round = 0; round < rounds; ++round) {
+        pair.prepare();
         bool own_first = round % 2 == 0;
         if (own_first)
             own.push_back(seconds_of(pair.own, pair.calls));

@@ -17,7 +17,8 @@ struct pairing {
     double at_most; // the ratio that is asked for
     std::function<void()> own;
     std::function<void()> reference;
-    unsigned calls = 1; // of each in a round
+    unsigned calls = 1;                    // of each in a round
+    std::function<void()> prepare = [] {}; // before each round, not measured
 };
 
 void print_heading();
