@@ -4,14 +4,15 @@ add_library(quillmere_compiler_options INTERFACE)
 target_compile_features(quillmere_compiler_options INTERFACE cxx_std_17)
 
 set(warnings -Wall -Wextra -Wpedantic -Wconversion -Wformat=2)
-# Where several sources are compiled as one, what is another's own is no shadow, and stays its own.
+# Where several sources are compiled as one, what is another's own is no shadow, and stays its own. One compiler can tell
+# it from the shadows that a source throws by itself.
 set(united "$<BOOL:$<TARGET_PROPERTY:UNITY_BUILD>>")
 list(APPEND warnings "$<$<NOT:${united}>:-Wshadow>")
 set(cxx_warnings -Wold-style-cast -Wmissing-declarations)
 if(CMAKE_CXX_COMPILER_ID MATCHES "Clang")
     list(APPEND cxx_warnings -Wmissing-prototypes)
 elseif(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
-    list(APPEND cxx_warnings "$<${united}:-Wno-subobject-linkage>")
+    list(APPEND cxx_warnings "$<${united}:-Wshadow=local;-Wno-subobject-linkage>")
 endif()
 target_compile_options(quillmere_compiler_options INTERFACE
     ${warnings} "$<$<COMPILE_LANGUAGE:CXX>:${cxx_warnings}>")

@@ -7,6 +7,19 @@
 #include <fcntl.h>
 
 namespace quillmere::tools {
+namespace {
+
+// Like read(), but not ended by a signal.
+ssize_t read_piece(int number, char *piece, std::size_t size)
+{
+    for (;;) {
+        const ssize_t count = ::read(number, piece, size);
+        if (count >= 0 || errno != EINTR)
+            return count;
+    }
+}
+
+} // namespace
 
 bool write_all(int number, std::string_view bytes)
 {
@@ -25,9 +38,7 @@ bool read_all(int number, std::size_t limit, std::string &text)
 {
     std::array<char, 4096> piece;
     for (;;) {
-        const ssize_t count = ::read(number, piece.data(), piece.size());
-        if (count < 0 && errno == EINTR)
-            continue;
+        const ssize_t count = read_piece(number, piece.data(), piece.size());
         if (count <= 0)
             return count == 0;
         text.append(piece.data(), static_cast<std::size_t>(count));
@@ -42,9 +53,7 @@ bool read_pieces(int number, const std::function<void(std::string_view piece)> &
 {
     std::vector<char> piece(256 * 1024);
     for (;;) {
-        const ssize_t count = ::read(number, piece.data(), piece.size());
-        if (count < 0 && errno == EINTR)
-            continue;
+        const ssize_t count = read_piece(number, piece.data(), piece.size());
         if (count <= 0)
             return count == 0;
         take({piece.data(), static_cast<std::size_t>(count)});
