@@ -81,4 +81,8 @@ inline std::string every_byte_encoded()
     return text;
 }
 
+// What the two are in a target.
+inline const std::string plain = special;
+inline const std::string encoded = every_byte_encoded();
+
 } // namespace quillmere_test

@@ -7,13 +7,12 @@
 #include "api/account_operations.h"
 #include "support/library_fixture.h"
 #include "support/temporary_folder.h"
+#include "transport/exchange.h"
 
 namespace quillmere_test {
 namespace {
 
 using optional_text = std::optional<std::string>;
-
-constexpr const char *no_code = "Response error: no server HTTP response code received";
 
 std::string with_code(int64_t code)
 {

@@ -14,7 +14,7 @@ TEST_P(AccountRequest, IsComposedInOrder)
     EXPECT_EQ(target_of(GetParam().call), GetParam().target);
 }
 
-const request_case requests[] = {
+const request_case account_requests[] = {
     {"info", [] { return user_info_call(special); },
      "/api/user/get_info.php?session_token=" + std::string(special) + "&version=2"},
     {"info_empty", [] { return user_info_call(""); },
@@ -35,7 +35,7 @@ const request_case requests[] = {
      "/api/user/myfiles_revision.php?session_token=&version=2"},
 };
 
-INSTANTIATE_TEST_SUITE_P(Api, AccountRequest, testing::ValuesIn(requests), name_of_case);
+INSTANTIATE_TEST_SUITE_P(Api, AccountRequest, testing::ValuesIn(account_requests), name_of_case);
 
 constexpr const char *profile_elements =
     "<email>01</email><first_name>02</first_name><last_name>03</last_name>"

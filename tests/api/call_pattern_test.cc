@@ -1,6 +1,7 @@
 // What all operations have in common: one request, one verdict on the reply, and what is logged.
 #include <gmock/gmock.h>
 
+#include "api/account_operations.h"
 #include "api/operations.h"
 #include "support/library_fixture.h"
 #include "support/temporary_folder.h"
@@ -11,17 +12,11 @@ namespace {
 
 using testing::MatchesRegex;
 
-constexpr const char *no_code = "Response error: no server HTTP response code received";
 constexpr const char *unreadable_error = "Error parsing XML when trying to get error text";
 
 std::string unusable(int code)
 {
     return "Response error: received server HTTP response code " + std::to_string(code);
-}
-
-std::string refusal(const std::string &inside)
-{
-    return "<response><result>Error</result>" + inside + "</response>";
 }
 
 class Operation : public library_test, public testing::WithParamInterface<operation> {
@@ -218,7 +213,7 @@ TEST_P(RefusedOperation, HasTheServicesNumberAndMessageAndTellsTheHook)
 {
     const auto &[what, error] = GetParam();
     hook_recorder hook;
-    const std::string reply = refusal(error.inside + std::string(what.payload));
+    const std::string reply = refusing_reply(error.inside + std::string(what.payload));
     server.answer(http_reply(403, reply));
 
     performed result = what.perform();

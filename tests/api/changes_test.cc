@@ -17,21 +17,22 @@ TEST_P(ChangesRequest, IsComposedInOrder)
     EXPECT_EQ(target_of(GetParam().call), GetParam().target);
 }
 
-const std::string path = "/api/device/get_changes.php";
+const std::string changes_path = "/api/device/get_changes.php";
 
-const request_case requests[] = {
+const request_case changes_requests[] = {
     {"zero", [] { return device_changes_call("t", 0, 0); },
-     path + "?session_token=t&revision=0&device_id=0&version=2"},
+     changes_path + "?session_token=t&revision=0&device_id=0&version=2"},
     {"largest", [] { return device_changes_call("t", UINT64_MAX, UINT32_MAX); },
-     path + "?session_token=t&revision=18446744073709551615&device_id=4294967295&version=2"},
+     changes_path +
+         "?session_token=t&revision=18446744073709551615&device_id=4294967295&version=2"},
     {"special", [] { return device_changes_call(special, 1, 2); },
-     path + "?session_token=" + special + "&revision=1&device_id=2&version=2"},
+     changes_path + "?session_token=" + special + "&revision=1&device_id=2&version=2"},
     {"empty", [] { return device_changes_call("", 1, 2); },
-     path + "?session_token=&revision=1&device_id=2&version=2"},
+     changes_path + "?session_token=&revision=1&device_id=2&version=2"},
     {"nothing", [] { return device_changes_call(nullptr, 1, 2); },
-     path + "?session_token=&revision=1&device_id=2&version=2"},
+     changes_path + "?session_token=&revision=1&device_id=2&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(Api, ChangesRequest, testing::ValuesIn(requests), name_of_case);
+INSTANTIATE_TEST_SUITE_P(Api, ChangesRequest, testing::ValuesIn(changes_requests), name_of_case);
 
 class GetDeviceChanges : public account_call_test {
 protected:

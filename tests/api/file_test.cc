@@ -10,10 +10,7 @@ class FileRequest : public account_call_test, public testing::WithParamInterface
 
 TEST_P(FileRequest, IsComposedInOrder) { EXPECT_EQ(target_of(GetParam().call), GetParam().target); }
 
-const std::string plain = special;
-const std::string encoded = every_byte_encoded();
-
-const request_case info_requests[] = {
+const request_case file_info_requests[] = {
     {"special", [] { return file_info_call(special, special); },
      "/api/file/get_info.php?quick_key=" + plain + "&session_token=" + plain + "&version=2"},
     {"no_token", [] { return file_info_call("q", nullptr); },
@@ -23,9 +20,10 @@ const request_case info_requests[] = {
     {"nothing", [] { return file_info_call(nullptr, nullptr); },
      "/api/file/get_info.php?quick_key=&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(GetFileInfo, FileRequest, testing::ValuesIn(info_requests), name_of_case);
+INSTANTIATE_TEST_SUITE_P(GetFileInfo, FileRequest, testing::ValuesIn(file_info_requests),
+                         name_of_case);
 
-const request_case create_requests[] = {
+const request_case file_create_requests[] = {
     {"nothing", [] { return create_file_call("t", nullptr, nullptr, nullptr, nullptr); },
      "/api/file/create.php?session_token=t&version=2"},
     {"no_token", [] { return create_file_call(nullptr, nullptr, nullptr, nullptr, nullptr); },
@@ -48,9 +46,10 @@ const request_case create_requests[] = {
     {"time", [] { return create_file_call("t", nullptr, nullptr, nullptr, "m"); },
      "/api/file/create.php?session_token=t&mtime=m&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(CreateFile, FileRequest, testing::ValuesIn(create_requests), name_of_case);
+INSTANTIATE_TEST_SUITE_P(CreateFile, FileRequest, testing::ValuesIn(file_create_requests),
+                         name_of_case);
 
-const request_case delete_requests[] = {
+const request_case file_delete_requests[] = {
     {"special", [] { return delete_file_call(special, special); },
      "/api/file/delete.php?session_token=" + plain + "&quick_key=" + plain + "&version=2"},
     {"empty", [] { return delete_file_call("", ""); },
@@ -58,9 +57,10 @@ const request_case delete_requests[] = {
     {"nothing", [] { return delete_file_call(nullptr, nullptr); },
      "/api/file/delete.php?session_token=&quick_key=&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(DeleteFile, FileRequest, testing::ValuesIn(delete_requests), name_of_case);
+INSTANTIATE_TEST_SUITE_P(DeleteFile, FileRequest, testing::ValuesIn(file_delete_requests),
+                         name_of_case);
 
-const request_case transfer_requests[] = {
+const request_case file_transfer_requests[] = {
     {"copy_special", [] { return copy_file_call(special, special, every_byte()); },
      "/api/file/copy.php?session_token=" + plain + "&quick_key=" + plain +
          "&folder_key=" + encoded + "&version=2"},
@@ -80,7 +80,7 @@ const request_case transfer_requests[] = {
     {"move_nothing", [] { return move_file_call(nullptr, nullptr, nullptr); },
      "/api/file/move.php?session_token=&quick_key=&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(CopyAndMoveFile, FileRequest, testing::ValuesIn(transfer_requests),
+INSTANTIATE_TEST_SUITE_P(CopyAndMoveFile, FileRequest, testing::ValuesIn(file_transfer_requests),
                          name_of_case);
 
 class FileReply : public account_call_test {};

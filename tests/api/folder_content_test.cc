@@ -14,12 +14,11 @@ TEST_P(ContentRequest, IsComposedInOrder)
     EXPECT_EQ(target_of(GetParam().call), GetParam().target);
 }
 
-const std::string plain = special;
 const std::string content = "/api/1.0/folder/get_content.php";
 const std::string attach = "/api/folder/attach_foreign.php";
 const std::string detach = "/api/folder/detach_foreign.php";
 
-const request_case requests[] = {
+const request_case folder_content_requests[] = {
     {"special", [] { return folder_content_call(special, special, special, special, special); },
      content + "?session_token=" + plain + "&folder_key=" + plain + "&device_id=" + plain +
          "&chunk=" + plain + "&content_type=" + plain + "&version=2"},
@@ -53,7 +52,8 @@ const request_case requests[] = {
     {"detach_nothing", [] { return detach_foreign_call(nullptr, nullptr); },
      detach + "?session_token=&folder_key=&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(Api, ContentRequest, testing::ValuesIn(requests), name_of_case);
+INSTANTIATE_TEST_SUITE_P(Api, ContentRequest, testing::ValuesIn(folder_content_requests),
+                         name_of_case);
 
 class GetFolderContent : public account_call_test {
 protected:

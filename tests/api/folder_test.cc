@@ -13,10 +13,7 @@ TEST_P(FolderRequest, IsComposedInOrder)
     EXPECT_EQ(target_of(GetParam().call), GetParam().target);
 }
 
-const std::string plain = special;
-const std::string encoded = every_byte_encoded();
-
-const request_case info_requests[] = {
+const request_case folder_info_requests[] = {
     {"nothing", [] { return folder_info_call(nullptr, nullptr, nullptr, nullptr); },
      "/api/folder/get_info.php?details=yes&version=2"},
     {"empty", [] { return folder_info_call("", "", "", ""); },
@@ -33,10 +30,10 @@ const request_case info_requests[] = {
     {"details", [] { return folder_info_call(nullptr, nullptr, nullptr, "no"); },
      "/api/folder/get_info.php?details=no&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(GetFolderInfo, FolderRequest, testing::ValuesIn(info_requests),
+INSTANTIATE_TEST_SUITE_P(GetFolderInfo, FolderRequest, testing::ValuesIn(folder_info_requests),
                          name_of_case);
 
-const request_case create_requests[] = {
+const request_case folder_create_requests[] = {
     {"name_alone", [] { return create_folder_call("t", "n", nullptr, nullptr); },
      "/api/folder/create.php?session_token=t&foldername=n&allow_duplicate_name=no&version=2"},
     {"no_name", [] { return create_folder_call("t", nullptr, nullptr, nullptr); },
@@ -56,10 +53,10 @@ const request_case create_requests[] = {
      "/api/folder/create.php?session_token=" + plain + "&foldername=" + encoded +
          "&parent_key=" + encoded + "&mtime=" + encoded + "&allow_duplicate_name=no&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(CreateFolder, FolderRequest, testing::ValuesIn(create_requests),
+INSTANTIATE_TEST_SUITE_P(CreateFolder, FolderRequest, testing::ValuesIn(folder_create_requests),
                          name_of_case);
 
-const request_case delete_requests[] = {
+const request_case folder_delete_requests[] = {
     {"special", [] { return delete_folder_call(special, every_byte()); },
      "/api/folder/delete.php?session_token=" + plain + "&folder_key=" + encoded + "&version=2"},
     {"empty", [] { return delete_folder_call("", ""); },
@@ -67,7 +64,7 @@ const request_case delete_requests[] = {
     {"nothing", [] { return delete_folder_call(nullptr, nullptr); },
      "/api/folder/delete.php?session_token=&folder_key=&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(DeleteFolder, FolderRequest, testing::ValuesIn(delete_requests),
+INSTANTIATE_TEST_SUITE_P(DeleteFolder, FolderRequest, testing::ValuesIn(folder_delete_requests),
                          name_of_case);
 
 call_outcome changed_privacy(int32_t privacy, int32_t recursive)
@@ -75,24 +72,24 @@ call_outcome changed_privacy(int32_t privacy, int32_t recursive)
     return update_folder_call("t", "k", nullptr, nullptr, nullptr, privacy, recursive, nullptr);
 }
 
-const std::string update = "/api/folder/update.php?session_token=t&folder_key=k&version=2";
+const std::string update_target = "/api/folder/update.php?session_token=t&folder_key=k&version=2";
 
 const request_case update_requests[] = {
-    {"nothing", [] { return changed_privacy(0, 0); }, update},
+    {"nothing", [] { return changed_privacy(0, 0); }, update_target},
     {"empty", [] { return update_folder_call("", "", "", "", "", 0, 0, ""); },
      "/api/folder/update.php?session_token=&folder_key=&version=2&description=&tags="},
     {"no_folder",
      [] { return update_folder_call(nullptr, nullptr, nullptr, nullptr, nullptr, 0, 0, nullptr); },
      "/api/folder/update.php?session_token=&folder_key=&version=2"},
     {"name", [] { return update_folder_call("t", "k", "n", nullptr, nullptr, 0, 0, nullptr); },
-     update + "&foldername=n"},
+     update_target + "&foldername=n"},
     {"description",
      [] { return update_folder_call("t", "k", nullptr, "d e", nullptr, 0, 0, nullptr); },
-     update + "&description=d%20e"},
+     update_target + "&description=d%20e"},
     {"tags", [] { return update_folder_call("t", "k", nullptr, nullptr, "g", 0, 0, nullptr); },
-     update + "&tags=g"},
+     update_target + "&tags=g"},
     {"time", [] { return update_folder_call("t", "k", nullptr, nullptr, nullptr, 0, 0, "m"); },
-     update + "&mtime=m"},
+     update_target + "&mtime=m"},
     {"special",
      [] {
          const char *every = every_byte();
@@ -102,23 +99,23 @@ const request_case update_requests[] = {
          "&version=2&foldername=" + encoded + "&description=" + encoded + "&tags=" + encoded +
          "&privacy=public&privacy_recursive=yes&mtime=" + encoded},
     {"public", [] { return changed_privacy(-1, 0); },
-     update + "&privacy=public&privacy_recursive=no"},
+     update_target + "&privacy=public&privacy_recursive=no"},
     {"public_below", [] { return changed_privacy(-1, 1); },
-     update + "&privacy=public&privacy_recursive=yes"},
+     update_target + "&privacy=public&privacy_recursive=yes"},
     {"private", [] { return changed_privacy(1, 0); },
-     update + "&privacy=private&privacy_recursive=no"},
+     update_target + "&privacy=private&privacy_recursive=no"},
     {"private_below", [] { return changed_privacy(1, 2); },
-     update + "&privacy=private&privacy_recursive=yes"},
+     update_target + "&privacy=private&privacy_recursive=yes"},
     {"private_below_negative", [] { return changed_privacy(1, -1); },
-     update + "&privacy=private&privacy_recursive=yes"},
-    {"unchanged_below", [] { return changed_privacy(0, 1); }, update},
-    {"no_privacy", [] { return changed_privacy(2, 1); }, update},
-    {"no_negative_privacy", [] { return changed_privacy(-2, 1); }, update},
+     update_target + "&privacy=private&privacy_recursive=yes"},
+    {"unchanged_below", [] { return changed_privacy(0, 1); }, update_target},
+    {"no_privacy", [] { return changed_privacy(2, 1); }, update_target},
+    {"no_negative_privacy", [] { return changed_privacy(-2, 1); }, update_target},
 };
 INSTANTIATE_TEST_SUITE_P(UpdateFolder, FolderRequest, testing::ValuesIn(update_requests),
                          name_of_case);
 
-const request_case transfer_requests[] = {
+const request_case folder_transfer_requests[] = {
     {"copy_special", [] { return copy_folder_call(special, special, special); },
      "/api/folder/copy.php?session_token=" + plain + "&folder_key_src=" + plain +
          "&folder_key_dst=" + plain + "&version=2"},
@@ -138,8 +135,8 @@ const request_case transfer_requests[] = {
     {"move_nothing", [] { return move_folder_call(nullptr, nullptr, nullptr); },
      "/api/folder/move.php?session_token=&folder_key_src=&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(CopyAndMoveFolder, FolderRequest, testing::ValuesIn(transfer_requests),
-                         name_of_case);
+INSTANTIATE_TEST_SUITE_P(CopyAndMoveFolder, FolderRequest,
+                         testing::ValuesIn(folder_transfer_requests), name_of_case);
 
 class FolderReply : public account_call_test {};
 

@@ -13,32 +13,31 @@ TEST_P(LinksRequest, IsComposedInOrder)
     EXPECT_EQ(target_of(GetParam().call), GetParam().target);
 }
 
-const std::string plain = special;
-const std::string path = "/api/file/get_links.php";
+const std::string links_path = "/api/file/get_links.php";
 
-const request_case requests[] = {
+const request_case links_requests[] = {
     {"special", [] { return links_call(every_byte(), special, special); },
-     path + "?quick_key=" + every_byte_encoded() + "&link_type=" + plain +
-         "&session_token=" + plain + "&version=2"},
+     links_path + "?quick_key=" + encoded + "&link_type=" + plain + "&session_token=" + plain +
+         "&version=2"},
     {"several_files", [] { return links_call("a,b", nullptr, nullptr); },
-     path + "?quick_key=a%2cb&version=2"},
+     links_path + "?quick_key=a%2cb&version=2"},
     {"type", [] { return links_call("q", "view", nullptr); },
-     path + "?quick_key=q&link_type=view&version=2"},
+     links_path + "?quick_key=q&link_type=view&version=2"},
     {"token", [] { return links_call("q", nullptr, "t"); },
-     path + "?quick_key=q&session_token=t&version=2"},
-    {"empty", [] { return links_call("", "", ""); }, path + "?quick_key=&version=2"},
+     links_path + "?quick_key=q&session_token=t&version=2"},
+    {"empty", [] { return links_call("", "", ""); }, links_path + "?quick_key=&version=2"},
     {"nothing", [] { return links_call(nullptr, nullptr, nullptr); },
-     path + "?quick_key=&version=2"},
+     links_path + "?quick_key=&version=2"},
 
     {"download_special", [] { return download_link_call(special, special); },
-     path + "?session_token=" + plain + "&quick_key=" + plain +
+     links_path + "?session_token=" + plain + "&quick_key=" + plain +
          "&link_type=direct_download&version=2"},
     {"download_empty", [] { return download_link_call("", ""); },
-     path + "?session_token=&quick_key=&link_type=direct_download&version=2"},
+     links_path + "?session_token=&quick_key=&link_type=direct_download&version=2"},
     {"download_nothing", [] { return download_link_call(nullptr, nullptr); },
-     path + "?session_token=&quick_key=&link_type=direct_download&version=2"},
+     links_path + "?session_token=&quick_key=&link_type=direct_download&version=2"},
 };
-INSTANTIATE_TEST_SUITE_P(Api, LinksRequest, testing::ValuesIn(requests), name_of_case);
+INSTANTIATE_TEST_SUITE_P(Api, LinksRequest, testing::ValuesIn(links_requests), name_of_case);
 
 class GetLinks : public account_call_test {
 protected:

@@ -7,11 +7,14 @@
 namespace quillmere_test {
 namespace {
 
-constexpr const char *key = "key of the application";
+constexpr const char *login_key = "key of the application";
 
 class LoginToken : public library_test {
 protected:
-    int32_t get() { return get_login_token(email, password, "42", key, pkey.place(), &token); }
+    int32_t get()
+    {
+        return get_login_token(email, password, "42", login_key, pkey.place(), &token);
+    }
 
     const char *email = "user@example.com";
     const char *password = "pa&ss w/rd%";
@@ -126,7 +129,7 @@ TEST_F(LoginToken, LeavesThePkeyAloneWhenAnEmptyReplyArrives)
     pkey.take();
 }
 
-struct login {
+struct login_case {
     const char *what;
     const char *email;
     const char *password;
@@ -135,14 +138,14 @@ struct login {
     const char *query;
 };
 
-void PrintTo(const login &each, std::ostream *out) { *out << each.what; }
+void PrintTo(const login_case &each, std::ostream *out) { *out << each.what; }
 
-class LoginTokenRequest : public LoginToken, public testing::WithParamInterface<login> {};
+class LoginTokenRequest : public LoginToken, public testing::WithParamInterface<login_case> {};
 
 // All four pieces are always signed and all parameters sent, whether they are given or not.
 TEST_P(LoginTokenRequest, IsSignedAsItStands)
 {
-    const login &given = GetParam();
+    const login_case &given = GetParam();
     server.answer(xml_reply("<response><result>Error</result></response>"));
 
     get_login_token(given.email, given.password, given.application_id, given.application_key,
@@ -156,19 +159,19 @@ TEST_P(LoginTokenRequest, IsSignedAsItStands)
 
 INSTANTIATE_TEST_SUITE_P(
     Credentials, LoginTokenRequest,
-    testing::Values(login{"everything", "user@example.com", "pa&ss w/rd%", "42", key,
-                          "?email=user%40example%2ecom&password=pa%26ss%20w%2frd%25"
-                          "&application_id=42"
-                          "&signature=c3182a3d5fc409b124806fb498ea97318c374845&version=2"},
-                    login{"no password", "fb token", nullptr, "+42", key,
-                          "?email=fb%20token&password=&application_id=%2b42"
-                          "&signature=af8472ef7bb624e84521e6e61c8c82fd344678d2&version=2"},
-                    login{"no address", "", "fb token+", "42", key,
-                          "?email=&password=fb%20token%2b&application_id=42"
-                          "&signature=af8472ef7bb624e84521e6e61c8c82fd344678d2&version=2"},
-                    login{"an application alone", nullptr, nullptr, "42", key,
-                          "?email=&password=&application_id=42"
-                          "&signature=8e0b9a70f0ee010cf40f269127a47b6ae4614714&version=2"}));
+    testing::Values(login_case{"everything", "user@example.com", "pa&ss w/rd%", "42", login_key,
+                               "?email=user%40example%2ecom&password=pa%26ss%20w%2frd%25"
+                               "&application_id=42"
+                               "&signature=c3182a3d5fc409b124806fb498ea97318c374845&version=2"},
+                    login_case{"no password", "fb token", nullptr, "+42", login_key,
+                               "?email=fb%20token&password=&application_id=%2b42"
+                               "&signature=af8472ef7bb624e84521e6e61c8c82fd344678d2&version=2"},
+                    login_case{"no address", "", "fb token+", "42", login_key,
+                               "?email=&password=fb%20token%2b&application_id=42"
+                               "&signature=af8472ef7bb624e84521e6e61c8c82fd344678d2&version=2"},
+                    login_case{"an application alone", nullptr, nullptr, "42", login_key,
+                               "?email=&password=&application_id=42"
+                               "&signature=8e0b9a70f0ee010cf40f269127a47b6ae4614714&version=2"}));
 
 } // namespace
 } // namespace quillmere_test

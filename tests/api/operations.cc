@@ -4,6 +4,7 @@
 #include <ostream>
 
 #include "api/deliberate_leak.h"
+#include "api/taken_results.h"
 
 namespace quillmere_test {
 
@@ -22,12 +23,10 @@ std::optional<std::string> pkey_slot::take()
 
 namespace {
 
-char rubbish[] = "rubbish";
-
 performed limits()
 {
-    auto *record = reinterpret_cast<system_limits *>(rubbish);
-    char *message = rubbish;
+    auto *record = rubbish<system_limits>();
+    char *message = rubbish<char>();
     int32_t status = get_system_limits(&record, &message);
     performed result = {status, taken(message), record != nullptr};
     system_limits_delete(&record);
@@ -36,8 +35,8 @@ performed limits()
 
 performed system()
 {
-    auto *record = reinterpret_cast<system_status *>(rubbish);
-    char *message = rubbish;
+    auto *record = rubbish<system_status>();
+    char *message = rubbish<char>();
     int32_t status = get_system_status(&record, &message);
     performed result = {status, taken(message), record != nullptr};
     system_status_delete(&record);
@@ -48,7 +47,7 @@ performed device()
 {
     uint64_t revision = 77;
     int32_t jobs = 77;
-    char *message = rubbish;
+    char *message = rubbish<char>();
     int32_t status = get_device_status("session+token", 12, &revision, &jobs, &message);
     return {status, taken(message), revision != 0 || jobs != 0};
 }
@@ -64,7 +63,7 @@ performed told_apart(int32_t status, char *token_or_message)
 
 performed session()
 {
-    char *token = rubbish;
+    char *token = rubbish<char>();
     int32_t status = get_session_token("user@example.com", "pa&ss w/rd%", nullptr, "42",
                                        "key of the application", &token);
     return told_apart(status, token);
@@ -73,7 +72,7 @@ performed session()
 performed login()
 {
     pkey_slot pkey;
-    char *token = rubbish;
+    char *token = rubbish<char>();
     int32_t status;
     {
         deliberate_leak of_the_pkey_of_a_malformed_reply;
@@ -87,7 +86,7 @@ performed login()
 
 performed renewal()
 {
-    char *token = rubbish;
+    char *token = rubbish<char>();
     int32_t status = renew_session_token("session+token", &token);
     return told_apart(status, token);
 }

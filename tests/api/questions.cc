@@ -9,25 +9,20 @@
 namespace quillmere_test {
 namespace {
 
-std::string success(const std::string &inside)
-{
-    return xml_reply("<response><result>Success</result>" + inside + "</response>");
-}
-
 // The entries of a folder bear its key, so that no other listing can be taken for it.
 std::string listing_of(const std::string &folder)
 {
     std::string entries;
     for (const char *each : {"1", "2", "3"})
         entries += std::string("<file><filename>") + each + " of " + folder + "</filename></file>";
-    return success("<folder><name>in " + folder + "</name></folder>" + entries);
+    return success_reply("<folder><name>in " + folder + "</name></folder>" + entries);
 }
 
 std::string feed_from(const std::string &revision)
 {
-    return success("<updated><file><quickkey>k" + revision + "</quickkey><revision>" + revision +
-                   "</revision></file></updated><device_revision>" + revision +
-                   "</device_revision>");
+    return success_reply("<updated><file><quickkey>k" + revision + "</quickkey><revision>" +
+                         revision + "</revision></file></updated><device_revision>" + revision +
+                         "</device_revision>");
 }
 
 } // namespace
@@ -46,32 +41,32 @@ std::string answer_to(const request &asked)
         std::string id = asked.parameter("device_id").value_or("");
         if (token == "refused")
             return refusal(id, "refused " + id);
-        return success("<device_revision>9" + id +
-                       "</device_revision>"
-                       "<async_jobs_in_progress>" +
-                       token + "</async_jobs_in_progress>");
+        return success_reply("<device_revision>9" + id +
+                             "</device_revision>"
+                             "<async_jobs_in_progress>" +
+                             token + "</async_jobs_in_progress>");
     }
     if (path == renew_session_token_uri)
-        return success("<session_token>new " + token + "</session_token>");
+        return success_reply("<session_token>new " + token + "</session_token>");
     std::string email = asked.parameter("email").value_or("");
     if (path == get_session_token_uri)
-        return success("<session_token>for " + email + "</session_token>");
+        return success_reply("<session_token>for " + email + "</session_token>");
     if (path == get_login_token_uri)
-        return success("<pkey>key of " + email + "</pkey><login_token>for " + email +
-                       "</login_token>");
+        return success_reply("<pkey>key of " + email + "</pkey><login_token>for " + email +
+                             "</login_token>");
     if (path == get_folder_content_uri)
         return listing_of(asked.parameter("folder_key").value_or(""));
     if (path == get_device_changes_uri)
         return feed_from(asked.parameter("revision").value_or(""));
     if (path == get_links_uri)
-        return success("<link><view>of " + asked.parameter("quick_key").value_or("") +
-                       "</view></link>");
+        return success_reply("<link><view>of " + asked.parameter("quick_key").value_or("") +
+                             "</view></link>");
     if (path == get_user_info_uri)
-        return success("<user_info><email>" + token + "</email></user_info>");
+        return success_reply("<user_info><email>" + token + "</email></user_info>");
     if (path == get_system_limits_uri)
-        return success("<max_keys>10</max_keys>");
+        return success_reply("<max_keys>10</max_keys>");
     if (path == get_system_status_uri)
-        return success("<database>fine</database>");
+        return success_reply("<database>fine</database>");
     return http_reply(404, "no such thing as " + asked.target);
 }
 
@@ -148,7 +143,7 @@ bool health(uint32_t)
     return right;
 }
 
-bool exchange(uint32_t number)
+bool direct_exchange(uint32_t number)
 {
     std::string target = "/nothing/" + std::to_string(number);
     char *response = nullptr;
@@ -224,8 +219,9 @@ bool profile(uint32_t number)
 
 } // namespace
 
-const question questions[question_count] = {device, refused,  renewal, session, login, limits,
-                                            health, exchange, listing, feed,    links, profile};
+const question questions[question_count] = {device,  refused, renewal, session,
+                                            login,   limits,  health,  direct_exchange,
+                                            listing, feed,    links,   profile};
 
 unsigned wrong_answers(unsigned thread, unsigned rounds)
 {

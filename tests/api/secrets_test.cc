@@ -19,7 +19,7 @@ namespace {
 using testing::HasSubstr;
 using testing::Not;
 
-constexpr const char *email = "canary@example.com";
+constexpr const char *secret_email = "canary@example.com";
 constexpr const char *application_key = "Canary5Ak+key";
 
 struct secret_call {
@@ -40,7 +40,7 @@ std::string signature_of(const std::string &credentials)
 void get_session(const char *password, const char *facebook_token)
 {
     char *token = nullptr;
-    get_session_token(email, password, facebook_token, "42", application_key, &token);
+    get_session_token(secret_email, password, facebook_token, "42", application_key, &token);
     api_free(token);
 }
 
@@ -48,7 +48,7 @@ void get_login()
 {
     pkey_slot pkey;
     char *token = nullptr;
-    if (get_login_token(email, "Canary5Pw", "42", application_key, pkey.place(), &token) !=
+    if (get_login_token(secret_email, "Canary5Pw", "42", application_key, pkey.place(), &token) !=
         QM_MALFORMED_REPLY)
         pkey.take();
     api_free(token);
@@ -84,7 +84,7 @@ std::vector<secret_call> secret_calls()
     std::vector<secret_call> calls = {
         {"get_session_token by password",
          [] { get_session("Canary5Pw", nullptr); },
-         {"Canary5Pw", signature_of(email + std::string("Canary5Pw"))},
+         {"Canary5Pw", signature_of(secret_email + std::string("Canary5Pw"))},
          nullptr},
         {"get_session_token by Facebook",
          [] { get_session(nullptr, "Canary5Fb"); },
@@ -92,7 +92,7 @@ std::vector<secret_call> secret_calls()
          nullptr},
         {"get_login_token",
          get_login,
-         {"Canary5Pw", signature_of(email + std::string("Canary5Pw"))},
+         {"Canary5Pw", signature_of(secret_email + std::string("Canary5Pw"))},
          nullptr},
         {"update_file", update, {"Canary5St"}, "Api url:\n"},
         {"an upload connection", upload, {"Canary5St"}, nullptr},

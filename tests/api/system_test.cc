@@ -7,11 +7,6 @@
 namespace quillmere_test {
 namespace {
 
-std::string success(const std::string &inside)
-{
-    return xml_reply("<response><result>Success</result>" + inside + "</response>");
-}
-
 class SystemLimits : public library_test {
 protected:
     ~SystemLimits() override { system_limits_delete(&limits); }
@@ -29,15 +24,15 @@ protected:
 
 TEST_F(SystemLimits, AreReadFromTheirElements)
 {
-    server.answer(success("<max_objects>a</max_objects><max_keys>b</max_keys>"
-                          "<max_image_size>c</max_image_size>"
-                          "<zip_max_filesize>d</zip_max_filesize>"
-                          "<zip_max_total_filesize>e</zip_max_total_filesize>"
-                          "<folder_content_chunk_size>f</folder_content_chunk_size>"
-                          "<folder_depth_limit>g</folder_depth_limit>"
-                          "<limit_search_results>h</limit_search_results>"
-                          "<daily_shares_limit>i</daily_shares_limit>"
-                          "<device_changes_list_limit>j</device_changes_list_limit>"));
+    server.answer(success_reply("<max_objects>a</max_objects><max_keys>b</max_keys>"
+                                "<max_image_size>c</max_image_size>"
+                                "<zip_max_filesize>d</zip_max_filesize>"
+                                "<zip_max_total_filesize>e</zip_max_total_filesize>"
+                                "<folder_content_chunk_size>f</folder_content_chunk_size>"
+                                "<folder_depth_limit>g</folder_depth_limit>"
+                                "<limit_search_results>h</limit_search_results>"
+                                "<daily_shares_limit>i</daily_shares_limit>"
+                                "<device_changes_list_limit>j</device_changes_list_limit>"));
 
     EXPECT_EQ(get(), 0);
 
@@ -56,8 +51,8 @@ TEST_F(SystemLimits, AreReadFromTheirElements)
 
 TEST_F(SystemLimits, MayLackOne)
 {
-    server.answer(success("<max_keys>10</max_keys>"
-                          "<zip_max_total_filesize>20</zip_max_total_filesize>"));
+    server.answer(success_reply("<max_keys>10</max_keys>"
+                                "<zip_max_total_filesize>20</zip_max_total_filesize>"));
 
     EXPECT_EQ(get(), 0);
 
@@ -68,7 +63,7 @@ TEST_F(SystemLimits, MayLackOne)
 
 TEST_F(SystemLimits, AreSentWithoutQuery)
 {
-    server.answer(success(""));
+    server.answer(success_reply(""));
 
     get();
 
@@ -89,7 +84,7 @@ class SystemStatus : public library_test {};
 
 TEST_F(SystemStatus, IsReadFromItsElements)
 {
-    server.answer(success("<memcache>cold</memcache><database>warm</database>"));
+    server.answer(success_reply("<memcache>cold</memcache><database>warm</database>"));
     system_status *status = nullptr;
     char *message = nullptr;
 
@@ -104,7 +99,7 @@ TEST_F(SystemStatus, IsReadFromItsElements)
 
 TEST_F(SystemStatus, MayLackBoth)
 {
-    server.answer(success(""));
+    server.answer(success_reply(""));
     system_status *status = nullptr;
     char *message = nullptr;
 
@@ -119,7 +114,7 @@ TEST_F(SystemStatus, MayLackBoth)
 TEST_F(SystemStatus, MayHoldATextOf50Megabytes)
 {
     const std::string text(50 * 1000 * 1000, 't');
-    server.answer(success("<database>" + text + "</database>"));
+    server.answer(success_reply("<database>" + text + "</database>"));
     system_status *status = nullptr;
     char *message = nullptr;
 
@@ -146,8 +141,8 @@ protected:
 
 TEST_F(DeviceStatus, IsReadFromItsElements)
 {
-    server.answer(success("<device_revision>123</device_revision>"
-                          "<async_jobs_in_progress>yes</async_jobs_in_progress>"));
+    server.answer(success_reply("<device_revision>123</device_revision>"
+                                "<async_jobs_in_progress>yes</async_jobs_in_progress>"));
 
     EXPECT_EQ(get(), 0);
 
@@ -157,7 +152,7 @@ TEST_F(DeviceStatus, IsReadFromItsElements)
 
 TEST_F(DeviceStatus, IsLoggedWithItsToken)
 {
-    server.answer(success(""));
+    server.answer(success_reply(""));
 
     get();
 
@@ -169,7 +164,7 @@ TEST_F(DeviceStatus, IsLoggedWithItsToken)
 
 TEST_F(DeviceStatus, SendsItsTokenAsItIs)
 {
-    server.answer(success(""));
+    server.answer(success_reply(""));
     char *message = nullptr;
 
     get_device_status("a&b=c%20d+e", 1, &revision, &jobs_in_progress, &message);
@@ -225,7 +220,7 @@ class DeviceRevision : public DeviceStatus, public testing::WithParamInterface<r
 
 TEST_P(DeviceRevision, IsTheNumberThatTheTextBeginsWith)
 {
-    server.answer(success(GetParam().element));
+    server.answer(success_reply(GetParam().element));
 
     EXPECT_EQ(get(), 0);
 
@@ -256,7 +251,7 @@ class AsyncJobs : public DeviceStatus, public testing::WithParamInterface<jobs_t
 
 TEST_P(AsyncJobs, AreInProgressIfTheTextIsExactlyYes)
 {
-    server.answer(success(GetParam().element));
+    server.answer(success_reply(GetParam().element));
 
     EXPECT_EQ(get(), 0);
 
@@ -277,7 +272,7 @@ class DeviceId : public DeviceStatus, public testing::WithParamInterface<uint32_
 
 TEST_P(DeviceId, IsSentInDecimal)
 {
-    server.answer(success(""));
+    server.answer(success_reply(""));
 
     get(GetParam());
 

@@ -46,8 +46,8 @@ std::string bytes_at(const std::filesystem::path &path)
 
 } // namespace
 
-known_entry stored_entry(const std::string &kind, const std::string &parent,
-                         const std::string &name, const std::string &content)
+account_entry stored_entry(const std::string &kind, const std::string &parent,
+                           const std::string &name, const std::string &content)
 {
     return {parent, {}, {{"kind", kind}, {"name", name}, {"content", content}}};
 }

@@ -15,8 +15,8 @@ constexpr const char *no_content = "none";
  *
  * @param content the hash of a file's bytes, or no_content; empty for a folder
  */
-known_entry stored_entry(const std::string &kind, const std::string &parent,
-                         const std::string &name, const std::string &content);
+account_entry stored_entry(const std::string &kind, const std::string &parent,
+                           const std::string &name, const std::string &content);
 
 /** SHA-256, in hexadecimal digits. */
 std::string hash_of(const std::string &bytes);

@@ -26,12 +26,12 @@ protected:
         return made.body;
     }
 
-    known_entry describe(const std::string &who, const std::string &kind, const std::string &key)
+    account_entry describe(const std::string &who, const std::string &kind, const std::string &key)
     {
         const bool is_folder = kind == "folder";
         const std::string body =
             ask(who, kind + "/get_info", {{is_folder ? "folder_key" : "quick_key", key}}).body;
-        known_entry entry{element(body, "parent_folderkey"), element(body, "revision"), {}};
+        account_entry entry{element(body, "parent_folderkey"), element(body, "revision"), {}};
         if (is_folder)
             for (const char *fact : folder_facts)
                 entry.info[fact] = element(body, fact);
@@ -74,7 +74,7 @@ protected:
         for (const char *kind : {"folder", "file"}) {
             const char *key = kind == std::string("folder") ? "folderkey" : "quickkey";
             for (const std::string &each : elements(element(body, "updated"), kind)) {
-                known_entry entry = describe(copy.who, kind, element(each, key));
+                account_entry entry = describe(copy.who, kind, element(each, key));
                 entry.parent = element(each, "parent_folderkey");
                 entry.revision = element(each, "revision");
                 copy.known[element(each, key)] = entry;
@@ -105,7 +105,7 @@ protected:
     void add(const std::string &who, const std::string &kind, const std::string &folder,
              const std::string &key, entries &all)
     {
-        known_entry entry = describe(who, kind, key);
+        account_entry entry = describe(who, kind, key);
         EXPECT_EQ(entry.parent, folder) << "a listing and a description disagree";
         EXPECT_TRUE(all.emplace(key, std::move(entry)).second) << "listed twice: " << key;
     }

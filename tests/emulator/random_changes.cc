@@ -4,7 +4,7 @@
 
 namespace {
 
-std::ostream &operator<<(std::ostream &out, const known_entry &entry)
+std::ostream &operator<<(std::ostream &out, const account_entry &entry)
 {
     out << "below " << entry.parent << " at " << entry.revision;
     for (const auto &[name, value] : entry.info)

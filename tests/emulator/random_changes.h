@@ -9,17 +9,17 @@
 #include <utility>
 #include <vector>
 
-struct known_entry {
+struct account_entry {
     std::string parent;
     std::string revision;
     std::map<std::string, std::string> info; // what its own description says
 
-    bool operator==(const known_entry &other) const
+    bool operator==(const account_entry &other) const
     {
         return parent == other.parent && revision == other.revision && info == other.info;
     }
 };
-using entries = std::map<std::string, known_entry>;
+using entries = std::map<std::string, account_entry>;
 
 /** What tells the two apart, one entry on a line; empty when nothing does. */
 std::string difference(const entries &known, const entries &listed);

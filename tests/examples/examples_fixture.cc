@@ -25,7 +25,7 @@ variables example_environment(const std::string &service, const std::string &upl
             {"QUILLMERE_UPLOADS", uploads + desktop_upload_path},
             {"QUILLMERE_CA_FILE", root_path},
             {"QUILLMERE_EMAIL", account_email},
-            {"QUILLMERE_PASSWORD", account_password}};
+            {"QUILLMERE_PASSWORD", emulated_password}};
 }
 
 outcome run_example(const std::string &name, std::vector<std::string> arguments,

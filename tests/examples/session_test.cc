@@ -33,7 +33,7 @@ TEST_F(Examples, AccountStatus)
     const outcome ended = run("account_status",
                               {service.root_path(), service.https_url(), account_email, "42",
                                "quillmere-development-key"},
-                              {{"QUILLMERE_PASSWORD", account_password}});
+                              {{"QUILLMERE_PASSWORD", emulated_password}});
 
     EXPECT_EQ(ended.exit_status, 0) << ended.err;
     EXPECT_EQ(ended.out, "revision 1, idle\n");

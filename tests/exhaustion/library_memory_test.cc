@@ -64,13 +64,6 @@ size_t starve_step_by_step(memory_of library, const subject &starved, const Chec
     return felt;
 }
 
-std::string name_of(const testing::TestParamInfo<subject> &tested) { return tested.param.name; }
-
-std::string success(const std::string &elements)
-{
-    return "<response><result>Success</result>" + elements + "</response>";
-}
-
 class StarvedLibcurl : public testing::TestWithParam<subject> {
 protected:
     hooked_libcurl hooks;
@@ -81,7 +74,7 @@ TEST_P(StarvedLibcurl, IsAnOrdinaryFailedAttempt)
 {
     service.answer_nothing();
     const call_outcome failed = fed_outcome(memory_of::libcurl, GetParam());
-    service.answer(success(GetParam().payload));
+    service.answer(success_body(GetParam().payload));
     const call_outcome fed = fed_outcome(memory_of::libcurl, GetParam());
 
     size_t felt = starve_step_by_step(memory_of::libcurl, GetParam(), [&](const library_run &run) {
@@ -97,7 +90,7 @@ TEST_P(StarvedLibcurl, IsAnOrdinaryFailedAttempt)
 TEST_P(StarvedLibcurl, IsMadeGoodForByTheNextAttempt)
 {
     set_connection_attempts(2);
-    service.answer(success(GetParam().payload));
+    service.answer(success_body(GetParam().payload));
     const call_outcome fed = fed_outcome(memory_of::libcurl, GetParam());
 
     for (size_t allowed = 0;; ++allowed) {
@@ -108,7 +101,8 @@ TEST_P(StarvedLibcurl, IsMadeGoodForByTheNextAttempt)
     }
 }
 
-INSTANTIATE_TEST_SUITE_P(All, StarvedLibcurl, testing::ValuesIn(operation_subjects()), name_of);
+INSTANTIATE_TEST_SUITE_P(All, StarvedLibcurl, testing::ValuesIn(operation_subjects()),
+                         subject_name);
 
 // The results of an operation without what a reply that is damaged may leave in them: numbers, a
 // list that has been deleted, and in the place of a token the token or a message.
@@ -158,7 +152,7 @@ protected:
 
 TEST_P(StarvedExpat, IsAMalformedReplyToASuccess)
 {
-    EXPECT_GT(starve_with(success(GetParam().payload)), 0u);
+    EXPECT_GT(starve_with(success_body(GetParam().payload)), 0u);
 }
 
 TEST_P(StarvedExpat, IsAMalformedReplyToARefusal)
@@ -168,7 +162,7 @@ TEST_P(StarvedExpat, IsAMalformedReplyToARefusal)
               0u);
 }
 
-INSTANTIATE_TEST_SUITE_P(All, StarvedExpat, testing::ValuesIn(operation_subjects()), name_of);
+INSTANTIATE_TEST_SUITE_P(All, StarvedExpat, testing::ValuesIn(operation_subjects()), subject_name);
 
 class StarvedReader : public testing::TestWithParam<subject> {
 protected:
@@ -190,7 +184,7 @@ TEST_P(StarvedReader, NeverTakesAPartForTheWhole)
     EXPECT_EQ(fed_outcome(memory_of::expat, GetParam()), fed);
 }
 
-INSTANTIATE_TEST_SUITE_P(All, StarvedReader, testing::ValuesIn(reading_subjects()), name_of);
+INSTANTIATE_TEST_SUITE_P(All, StarvedReader, testing::ValuesIn(reading_subjects()), subject_name);
 
 int64_t port_in(const std::string &base_url)
 {

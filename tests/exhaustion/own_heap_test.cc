@@ -92,21 +92,14 @@ size_t starve_step_by_step(const subject &starved, const starved_run &fed)
     return felt;
 }
 
-std::string name_of(const testing::TestParamInfo<subject> &tested) { return tested.param.name; }
-
 class StarvedOperation : public testing::TestWithParam<subject> {
 protected:
     file_service service;
 };
 
-std::string reply_with(const std::string &elements)
-{
-    return "<response><result>Success</result>" + elements + "</response>";
-}
-
 TEST_P(StarvedOperation, HandsOutTheWholeResultOrAborts)
 {
-    service.answer(reply_with(GetParam().payload));
+    service.answer(success_body(GetParam().payload));
     const starved_run fed = fed_run(GetParam());
     EXPECT_EQ(fed.told.find("status 0,"), 0u) << fed.told;
     EXPECT_EQ(fed.kept, 0);
@@ -144,7 +137,8 @@ TEST_P(StarvedOperation, TellsOfAFailedExchangeOrAborts)
     EXPECT_GT(starve_step_by_step(GetParam(), fed), 0u);
 }
 
-INSTANTIATE_TEST_SUITE_P(All, StarvedOperation, testing::ValuesIn(operation_subjects()), name_of);
+INSTANTIATE_TEST_SUITE_P(All, StarvedOperation, testing::ValuesIn(operation_subjects()),
+                         subject_name);
 
 class StarvedReading : public testing::TestWithParam<subject> {
 protected:
@@ -159,7 +153,7 @@ TEST_P(StarvedReading, HandsOutTheWholeResultOrAborts)
     EXPECT_GT(starve_step_by_step(GetParam(), fed), 0u);
 }
 
-INSTANTIATE_TEST_SUITE_P(All, StarvedReading, testing::ValuesIn(reading_subjects()), name_of);
+INSTANTIATE_TEST_SUITE_P(All, StarvedReading, testing::ValuesIn(reading_subjects()), subject_name);
 
 TEST(StarvedTransfer, HandsOutTheWholeResultOrAborts)
 {

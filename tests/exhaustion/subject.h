@@ -1,6 +1,8 @@
 // What is called while memory runs out, and what became of it.
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <cstddef>
 #include <cstdint>
 #include <functional>
@@ -34,6 +36,11 @@ struct subject {
 inline std::ostream &operator<<(std::ostream &stream, const subject &each)
 {
     return stream << each.name;
+}
+
+inline std::string subject_name(const testing::TestParamInfo<subject> &tested)
+{
+    return tested.param.name;
 }
 
 // Every operation that asks the service.

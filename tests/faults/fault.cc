@@ -4,10 +4,12 @@
 #include <ostream>
 #include <utility>
 
+#include "transport/exchange.h"
+
 namespace quillmere_test {
 namespace {
 
-const char *name_of(wire each)
+const char *wire_name(wire each)
 {
     switch (each) {
     case wire::http:
@@ -51,7 +53,7 @@ expectation expectation::seen_elsewhere(size_t requests_per_attempt) const
 expectation fails(std::vector<CURLcode> failures)
 {
     expectation expected;
-    expected.message = "Response error: no server HTTP response code received";
+    expected.message = no_code;
     expected.failures = std::move(failures);
     return expected;
 }
@@ -123,7 +125,7 @@ void stall(connection &client) { client.stall(); }
 
 std::string trial::name() const
 {
-    std::string text = what.name + " over " + name_of(on);
+    std::string text = what.name + " over " + wire_name(on);
     for (char &each : text)
         if (!std::isalnum(static_cast<unsigned char>(each)))
             each = '_';

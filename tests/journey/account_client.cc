@@ -58,7 +58,7 @@ int32_t call(const std::string &action, const char *session, const given_texts &
 
 std::string text_of(const char *text) { return text ? text : ""; }
 
-known_entry known(const folder_info *folder)
+account_entry known(const folder_info *folder)
 {
     return {text_of(folder_info_get_parent_folderkey(folder)),
             text_of(folder_info_get_revision(folder)),
@@ -70,7 +70,7 @@ known_entry known(const folder_info *folder)
              {"privacy", text_of(folder_info_get_privacy(folder))}}};
 }
 
-known_entry known(const file_info *file)
+account_entry known(const file_info *file)
 {
     return {text_of(file_info_get_parent_folderkey(file)),
             text_of(file_info_get_revision(file)),
@@ -154,7 +154,7 @@ bool listed_account::list_chunk(const std::string &folder, const std::string &ch
     return folder_count + file_count >= chunk_size;
 }
 
-void listed_account::add(const std::string &key, known_entry entry, const std::string &folder)
+void listed_account::add(const std::string &key, account_entry entry, const std::string &folder)
 {
     entry.parent = folder;
     EXPECT_TRUE(found.emplace(key, std::move(entry)).second) << "listed twice: " << key;

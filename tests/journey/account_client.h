@@ -25,8 +25,8 @@ using owned_changes = std::unique_ptr<change_list, deleted_by<change_list, delet
 
 // What a record says of its entry; nothing for NULL.
 std::string text_of(const char *text);
-known_entry known(const folder_info *folder);
-known_entry known(const file_info *file);
+account_entry known(const folder_info *folder);
+account_entry known(const file_info *file);
 
 // What a test names by its action, done by the function that an application would call.
 class changes_by_library {
@@ -59,7 +59,7 @@ public:
 private:
     void list(const std::string &folder);
     bool list_chunk(const std::string &folder, const std::string &chunk, const char *type);
-    void add(const std::string &key, known_entry entry, const std::string &folder);
+    void add(const std::string &key, account_entry entry, const std::string &folder);
 
     std::string session_;
 };

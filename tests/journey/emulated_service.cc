@@ -47,7 +47,7 @@ void emulated_service::start()
 void emulated_service::add_account(const std::string &email) const
 {
     command_output({"add-account", "--email", email, "--password-file", "-"},
-                   std::string(account_password) + "\n");
+                   std::string(emulated_password) + "\n");
 }
 
 std::string emulated_service::command_output(std::vector<std::string> arguments,
@@ -75,7 +75,7 @@ library_on_service::library_on_service(const emulated_service &service, reached_
 std::string library_on_service::session_of(const std::string &email) const
 {
     char *token = nullptr;
-    const int32_t status = get_session_token(email.c_str(), account_password, nullptr, "42",
+    const int32_t status = get_session_token(email.c_str(), emulated_password, nullptr, "42",
                                              "quillmere-development-key", &token);
     const std::string text = taken(token);
     if (status != QM_OK)

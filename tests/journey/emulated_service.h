@@ -21,7 +21,7 @@ using owned_text = std::unique_ptr<char, free_text>;
 // What an out-parameter received, with NULL as an empty text.
 std::string taken(char *text);
 
-inline constexpr const char *account_password = "a pass word & more";
+inline constexpr const char *emulated_password = "a pass word & more";
 
 class emulated_service {
 public:

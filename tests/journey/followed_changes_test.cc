@@ -54,16 +54,16 @@ private:
         }
     }
 
-    known_entry described(const change_info *change) const
+    account_entry described(const change_info *change) const
     {
         const char *key = change_info_get_key(change);
-        known_entry entry = change_info_get_is_folder(change) ? folder(key) : file(key);
+        account_entry entry = change_info_get_is_folder(change) ? folder(key) : file(key);
         entry.parent = text_of(change_info_get_parent_folderkey(change));
         entry.revision = std::to_string(change_info_get_revision(change));
         return entry;
     }
 
-    known_entry folder(const char *key) const
+    account_entry folder(const char *key) const
     {
         char *message = nullptr;
         folder_info *info = nullptr;
@@ -74,7 +74,7 @@ private:
         return known(info);
     }
 
-    known_entry file(const char *key) const
+    account_entry file(const char *key) const
     {
         char *message = nullptr;
         file_info *info = nullptr;

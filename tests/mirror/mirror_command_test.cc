@@ -106,14 +106,6 @@ protected:
 
 using HostileService = fake_download;
 
-std::vector<std::string> names_in(const std::string &folder)
-{
-    std::vector<std::string> names;
-    for (const auto &each : fs::directory_iterator(folder))
-        names.push_back(each.path().filename());
-    return names;
-}
-
 } // namespace
 
 TEST_F(Mirror, BringsAllThatAFolderHolds)

@@ -92,4 +92,11 @@ std::string xml_reply(std::string_view body)
     return http_reply(200, body, {"Content-Type: text/xml; charset=utf-8"});
 }
 
+std::string success_body(std::string_view elements)
+{
+    return "<response><result>Success</result>" + std::string(elements) + "</response>";
+}
+
+std::string success_reply(std::string_view elements) { return xml_reply(success_body(elements)); }
+
 } // namespace quillmere_test

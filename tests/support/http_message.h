@@ -38,4 +38,8 @@ std::string http_reply(int status, std::string_view body, const header_lines &ex
 // The answer 200 with an XML body.
 std::string xml_reply(std::string_view body);
 
+// What the service says of a call that did its work, with the elements behind the result.
+std::string success_body(std::string_view elements);
+std::string success_reply(std::string_view elements);
+
 } // namespace quillmere_test

@@ -23,11 +23,6 @@ using testing::IsEmpty;
 
 using words = std::vector<std::string>;
 
-std::string success(const std::string &elements)
-{
-    return xml_reply("<response><result>Success</result>" + elements + "</response>");
-}
-
 std::string refusal(int number)
 {
     return http_reply(400, "<response><result>Error</result><error>" + std::to_string(number) +
@@ -57,7 +52,7 @@ protected:
             const auto found = replies_.find(asked.path());
             return found == replies_.end() ? refusal(101) : found->second(asked);
         });
-        on_listing([](const request &) { return success(""); });
+        on_listing([](const request &) { return success_reply(""); });
     }
 
     /** What an endpoint answers; to be said before the first run. */
@@ -73,9 +68,9 @@ protected:
     {
         on_listing([folders, files](const request &asked) {
             if (asked.parameter("folder_key"))
-                return success("");
+                return success_reply("");
             const bool of_folders = asked.parameter("content_type") == "folders";
-            return success(of_folders ? folders : files);
+            return success_reply(of_folders ? folders : files);
         });
     }
 
@@ -125,9 +120,9 @@ TEST_F(AccountService, IsAskedForChunksUntilOneIsNotFull)
         const std::string number = asked.parameter("chunk").value_or("none");
         const std::string size = "<chunk_size>2</chunk_size>";
         if (asked.parameter("content_type") == "files")
-            return success(size + file("f" + number, "x"));
-        return success(size + folder("a" + number, "x") +
-                       (number == "3" ? "" : folder("b" + number, "y")));
+            return success_reply(size + file("f" + number, "x"));
+        return success_reply(size + folder("a" + number, "x") +
+                             (number == "3" ? "" : folder("b" + number, "y")));
     });
 
     EXPECT_THAT(keys_in(result_of({"ls"})), ElementsAre("a1", "b1", "a2", "b2", "a3", "f1"));
@@ -139,9 +134,10 @@ TEST_F(AccountService, ThatMovesEntriesBetweenChunksShowsThemOnce)
     on_listing([](const request &asked) {
         const std::string size = "<chunk_size>2</chunk_size>";
         if (asked.parameter("content_type") == "files")
-            return success(size);
-        return success(size + (asked.parameter("chunk") == "1" ? folder("a", "x") + folder("b", "y")
-                                                               : folder("b", "y")));
+            return success_reply(size);
+        return success_reply(size + (asked.parameter("chunk") == "1"
+                                         ? folder("a", "x") + folder("b", "y")
+                                         : folder("b", "y")));
     });
 
     EXPECT_THAT(keys_in(result_of({"ls"})), ElementsAre("a", "b"));
@@ -150,7 +146,7 @@ TEST_F(AccountService, ThatMovesEntriesBetweenChunksShowsThemOnce)
 TEST_F(AccountService, ThatRepeatsItsOnlyChunkIsLeftAlone)
 {
     on_listing([](const request &) {
-        return success("<chunk_size>1</chunk_size>" + folder("a", "x") + file("f", "y"));
+        return success_reply("<chunk_size>1</chunk_size>" + folder("a", "x") + file("f", "y"));
     });
 
     EXPECT_THAT(keys_in(result_of({"ls"})), ElementsAre("a", "f"));
@@ -209,8 +205,9 @@ TEST_F(AccountService, CannotCommandATerminalByFailures)
 TEST_F(AccountService, IsAskedAgainForWhatIsOnlyRead)
 {
     int asked = 0;
-    on_listing(
-        [&asked](const request &) { return ++asked == 1 ? http_reply(503, "") : success(""); });
+    on_listing([&asked](const request &) {
+        return ++asked == 1 ? http_reply(503, "") : success_reply("");
+    });
 
     EXPECT_EQ(home.run({"ls"}).exit_status, 0);
     EXPECT_EQ(asked, 3) << "folders twice, files once";
@@ -251,8 +248,8 @@ TEST_F(AccountService, IsAskedAgainForLinksThatItOnlyLooksUp)
     int asked = 0;
     on("/api/file/get_links.php", [&asked](const request &) {
         return ++asked % 2 == 1 ? http_reply(503, "")
-                                : success("<link><quickkey>f</quickkey><view>v</view></link>"
-                                          "<direct_download>//d</direct_download>");
+                                : success_reply("<link><quickkey>f</quickkey><view>v</view></link>"
+                                                "<direct_download>//d</direct_download>");
     });
 
     EXPECT_EQ(result_of({"links", "/f", "--type", "view"}).at("links").at(0).at("link"), "v");
@@ -265,10 +262,10 @@ TEST_F(AccountService, TellsWhyThereIsNoLink)
 {
     hold("", file("f", "f"));
     on("/api/file/get_links.php",
-       success("<link><quickkey>f</quickkey><view>v</view>"
-               "<direct_download_error>118</direct_download_error>"
-               "<direct_download_error_message>empty</direct_download_error_message>"
-               "<edit_error_message>never</edit_error_message><error>7</error></link>"));
+       success_reply("<link><quickkey>f</quickkey><view>v</view>"
+                     "<direct_download_error>118</direct_download_error>"
+                     "<direct_download_error_message>empty</direct_download_error_message>"
+                     "<edit_error_message>never</edit_error_message><error>7</error></link>"));
 
     const auto links = result_of({"links", "/f"}).at("links");
 
@@ -288,8 +285,9 @@ TEST_F(AccountService, RefusesADownloadByNumber)
 {
     hold("", file("f", "f"));
     on("/api/file/get_links.php",
-       success("<link><direct_download_error>118</direct_download_error>"
-               "<direct_download_error_message>empty</direct_download_error_message></link>"));
+       success_reply(
+           "<link><direct_download_error>118</direct_download_error>"
+           "<direct_download_error_message>empty</direct_download_error_message></link>"));
 
     const auto error = result_of({"links", "/f", "--download"}, 3).at("error");
 
@@ -303,14 +301,14 @@ TEST_F(AccountService, HandsOutItsFeedInBlocks)
         const std::string since = asked.parameter("revision").value_or("none");
         EXPECT_EQ(asked.parameter("device_id"), "7");
         if (since == "3")
-            return success("<updated><folders>" + folder("d", "") + "</folders><files>" +
-                           file("f1", "one") + file("f2", "two") +
-                           "</files></updated><device_revision>9</device_revision>");
+            return success_reply("<updated><folders>" + folder("d", "") + "</folders><files>" +
+                                 file("f1", "one") + file("f2", "two") +
+                                 "</files></updated><device_revision>9</device_revision>");
         if (since == "9")
-            return success("<deleted><files>" + file("f1", "") +
-                           "</files></deleted><device_revision>12</device_revision>");
+            return success_reply("<deleted><files>" + file("f1", "") +
+                                 "</files></deleted><device_revision>12</device_revision>");
         EXPECT_EQ(since, "12");
-        return success("<device_revision>12</device_revision>");
+        return success_reply("<device_revision>12</device_revision>");
     });
 
     const auto document = result_of({"changes", "--since", "3", "--device", "7"});
@@ -340,7 +338,7 @@ TEST_F(AccountService, ThatAnswersWithHalfAFeedGivesNone)
 TEST_F(AccountService, ThatOnlyMovesLeavesAMoveWithANewNamePartlyDone)
 {
     hold(folder("d", "d"), file("f", "f"));
-    on("/api/file/move.php", success(""));
+    on("/api/file/move.php", success_reply(""));
     on("/api/file/update.php", refusal(115));
 
     const auto error = result_of({"mv", "/f", "/d/g"}, 8).at("error");
@@ -353,7 +351,7 @@ TEST_F(AccountService, ThatOnlyMovesLeavesAMoveWithANewNamePartlyDone)
 TEST_F(AccountService, ThatNamesNoCopyLeavesItsRenamingUndone)
 {
     hold(folder("d", "d"), file("f", "f"));
-    on("/api/file/copy.php", success(""));
+    on("/api/file/copy.php", success_reply(""));
 
     const auto error = result_of({"cp", "/f", "/d/g"}, 8).at("error");
 
@@ -365,7 +363,7 @@ TEST_F(AccountService, ThatCreatesTheFirstFolderAloneLeavesTheRestUndone)
 {
     on("/api/folder/create.php", [](const request &asked) {
         return asked.parameter("foldername") == "a"
-                   ? success("<folder_key>ka</folder_key>")
+                   ? success_reply("<folder_key>ka</folder_key>")
                    : refusal(asked.parameter("parent_key") == "ka" ? 116 : 1);
     });
 
@@ -377,7 +375,7 @@ TEST_F(AccountService, ThatCreatesTheFirstFolderAloneLeavesTheRestUndone)
 
 TEST_F(AccountService, ThatNamesNoNewFolderGetsNothingElsewhere)
 {
-    on("/api/folder/create.php", success(""));
+    on("/api/folder/create.php", success_reply(""));
 
     EXPECT_EQ(home.run({"mkdir", "-p", "/a/b"}).exit_status, 8);
     EXPECT_EQ(requests_for("/api/folder/create.php"), 1U) << "b must not land in the root";
@@ -408,7 +406,7 @@ TEST_F(AccountService, KeepsTheOldSessionUntilItGivesAnother)
 
 TEST_F(AccountService, GivesTheRenewedSessionToTheNextCommand)
 {
-    on("/api/user/renew_session_token.php", success("<session_token>fresh</session_token>"));
+    on("/api/user/renew_session_token.php", success_reply("<session_token>fresh</session_token>"));
 
     EXPECT_EQ(home.run({"renew"}).exit_status, 0);
     home.run({"ls"});
@@ -419,7 +417,7 @@ TEST_F(AccountService, GivesTheRenewedSessionToTheNextCommand)
 TEST_F(AccountService, GivesALoginTokenToAFileAlone)
 {
     on("/api/user/get_login_token.php",
-       success("<login_token>once-only</login_token><pkey>p</pkey>"));
+       success_reply("<login_token>once-only</login_token><pkey>p</pkey>"));
     const std::string path = home.folder().path_of("token");
     const words arguments = {"login-token",
                              "a@b",

@@ -14,14 +14,14 @@ namespace {
 using testing::IsEmpty;
 using words = std::vector<std::string>;
 
-const std::string email = "canary@example.org";
-const std::string application_id = "4711";
-const std::string application_key = "Canary5Ak/key+of";
-const std::string facebook_token = "Canary5Fb-token";
-const std::string wrong_password = "Canary5Wp & more";
-
 class EmulatorSecrets : public emulator_account {
 protected:
+    const std::string email = "canary@example.org";
+    const std::string application_id = "4711";
+    const std::string application_key = "Canary5Ak/key+of";
+    const std::string facebook_token = "Canary5Fb-token";
+    const std::string wrong_password = "Canary5Wp & more";
+
     EmulatorSecrets()
     {
         add_account(email, facebook_token);

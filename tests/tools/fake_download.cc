@@ -4,15 +4,6 @@
 
 namespace quillmere_test {
 
-namespace {
-
-std::string success(const std::string &elements)
-{
-    return xml_reply("<response><result>Success</result>" + elements + "</response>");
-}
-
-} // namespace
-
 fake_download::fake_download()
 {
     std::filesystem::create_directory(into);
@@ -33,20 +24,20 @@ std::string fake_download::reply_to(const request &asked) const
 {
     const std::string path = asked.path();
     if (path == "/api/file/get_info.php")
-        return success("<file_info>" + file_facts() + "</file_info>");
+        return success_reply("<file_info>" + file_facts() + "</file_info>");
     if (path == "/api/folder/get_info.php" && asked.parameter("folder_key") == "f")
-        return success("<folder_info><folderkey>f</folderkey><name>f</name></folder_info>");
+        return success_reply("<folder_info><folderkey>f</folderkey><name>f</name></folder_info>");
     if (path == "/api/1.0/folder/get_content.php")
-        return success(asked.parameter("content_type") == "files"
-                           ? "<files><file>" + file_facts() + "</file></files>"
-                           : "");
+        return success_reply(asked.parameter("content_type") == "files"
+                                 ? "<files><file>" + file_facts() + "</file></files>"
+                                 : "");
     if (path == "/api/device/get_status.php" || path == "/api/device/get_changes.php")
-        return success("<device_revision>1</device_revision>");
+        return success_reply("<device_revision>1</device_revision>");
     if (path == "/api/user/myfiles_revision.php")
-        return success("<revision>1</revision><epoch>1</epoch>");
+        return success_reply("<revision>1</revision><epoch>1</epoch>");
     if (path == "/api/file/get_links.php")
-        return success("<links><link><quickkey>k</quickkey><direct_download>" + link +
-                       "</direct_download></link></links>");
+        return success_reply("<links><link><quickkey>k</quickkey><direct_download>" + link +
+                             "</direct_download></link></links>");
     if (path == "/bytes")
         return bytes_reply(asked);
     return http_reply(404, "<response><result>Error</result><error>112</error>"

@@ -7,8 +7,6 @@ namespace quillmere_test {
 
 namespace fs = std::filesystem;
 
-namespace {
-
 std::vector<std::string> names_in(const std::string &folder)
 {
     std::vector<std::string> names;
@@ -17,8 +15,6 @@ std::vector<std::string> names_in(const std::string &folder)
     std::sort(names.begin(), names.end());
     return names;
 }
-
-} // namespace
 
 transfer_account::transfer_account()
 {

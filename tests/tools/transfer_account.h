@@ -9,6 +9,9 @@
 
 namespace quillmere_test {
 
+/** The names in a folder in their order, those that are hidden too. */
+std::vector<std::string> names_in(const std::string &folder);
+
 class transfer_account : public emulator_account {
 protected:
     /** Signed in, with an empty folder to download to. */

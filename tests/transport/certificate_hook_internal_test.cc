@@ -13,7 +13,7 @@
 namespace quillmere_test {
 namespace {
 
-constexpr const char *url = "https://service.example/a/path";
+constexpr const char *secure_url = "https://service.example/a/path";
 
 class CertificateHook : public library_test {
 protected:
@@ -77,7 +77,7 @@ class StoreFilledAfterwards : public CertificateHook {
     }
 };
 
-TEST_F(StoreFilledAfterwards, TrustsTheCertificates) { EXPECT_EQ(fetch(url).code, 0); }
+TEST_F(StoreFilledAfterwards, TrustsTheCertificates) { EXPECT_EQ(fetch(secure_url).code, 0); }
 
 class StoreFilledBefore : public CertificateHook {
     void perform() override
@@ -89,7 +89,7 @@ class StoreFilledBefore : public CertificateHook {
     }
 };
 
-TEST_F(StoreFilledBefore, TrustsTheCertificates) { EXPECT_EQ(fetch(url).code, 0); }
+TEST_F(StoreFilledBefore, TrustsTheCertificates) { EXPECT_EQ(fetch(secure_url).code, 0); }
 
 class StoreOfAProxyFilledAfterwards : public CertificateHook {
     void perform() override
@@ -100,7 +100,10 @@ class StoreOfAProxyFilledAfterwards : public CertificateHook {
     }
 };
 
-TEST_F(StoreOfAProxyFilledAfterwards, TrustsNoMoreThanBefore) { EXPECT_EQ(fetch(url).code, 0); }
+TEST_F(StoreOfAProxyFilledAfterwards, TrustsNoMoreThanBefore)
+{
+    EXPECT_EQ(fetch(secure_url).code, 0);
+}
 
 class StoreOfAProxyFilledBefore : public CertificateHook {
     void perform() override
@@ -111,7 +114,7 @@ class StoreOfAProxyFilledBefore : public CertificateHook {
     }
 };
 
-TEST_F(StoreOfAProxyFilledBefore, TrustsNoMoreThanBefore) { EXPECT_EQ(fetch(url).code, 0); }
+TEST_F(StoreOfAProxyFilledBefore, TrustsNoMoreThanBefore) { EXPECT_EQ(fetch(secure_url).code, 0); }
 
 class StoreOfAnUploadConnection : public CertificateHook {
     // The hook's data is gone when the transfer has ended, but not what was put into the store.
@@ -124,7 +127,7 @@ class StoreOfAnUploadConnection : public CertificateHook {
 
 TEST_F(StoreOfAnUploadConnection, OutlivesTheTransferAndTheLibrary)
 {
-    EXPECT_EQ(fetch(url).code, 0);
+    EXPECT_EQ(fetch(secure_url).code, 0);
     api_global_cleanup();
 
     EXPECT_TRUE(trusts(loopback_certificate()));
@@ -137,7 +140,7 @@ TEST_P(MemoryOptions, LeaveTheFileWhenOneIsRefused)
 {
     calls.refused = GetParam();
 
-    EXPECT_EQ(fetch(url).code, 0);
+    EXPECT_EQ(fetch(secure_url).code, 0);
 
     EXPECT_EQ(calls.last(CURLOPT_CAINFO).text, test_root_path());
     EXPECT_FALSE(calls.has(CURLOPT_CAINFO_BLOB));
@@ -147,7 +150,7 @@ INSTANTIATE_TEST_SUITE_P(Each, MemoryOptions, testing::ValuesIn(memory_options))
 
 TEST_F(CertificateHook, StandsBehindTheFile)
 {
-    fetch(url);
+    fetch(secure_url);
 
     std::vector<CURLoption> names = calls.names();
     auto file = std::find(names.begin(), names.end(), CURLOPT_CAINFO);
@@ -159,7 +162,7 @@ TEST_F(CertificateHook, IsNotSetForAFileThatCannotBeRead)
 {
     replace_owned_text(ca_cert_pem_path.path, test_root_path() + ".missing");
 
-    fetch(url);
+    fetch(secure_url);
 
     EXPECT_EQ(calls.last(CURLOPT_CAINFO).text, test_root_path() + ".missing");
     for (CURLoption each : memory_options)

@@ -9,8 +9,6 @@
 namespace quillmere_test {
 namespace {
 
-constexpr const char *url = "http://service.example/a/path";
-
 struct told {
     std::vector<int32_t> event_codes;
     int32_t attempts_from_now_on = 0;

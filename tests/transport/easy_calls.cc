@@ -11,7 +11,7 @@
 namespace quillmere_test {
 namespace {
 
-easy_calls *current = nullptr;
+easy_calls *current_easy = nullptr;
 
 bool is_text(CURLoption option)
 {
@@ -37,10 +37,10 @@ void note(CURLoption option, void *value)
         noted.text = text_of(*static_cast<const curl_blob *>(value));
     else
         noted.pointer = value;
-    current->options.push_back(noted);
+    current_easy->options.push_back(noted);
     if (option == CURLOPT_ERRORBUFFER) {
-        current->error_buffer = static_cast<char *>(value);
-        current->error_buffer_texts.push_back(current->error_buffer);
+        current_easy->error_buffer = static_cast<char *>(value);
+        current_easy->error_buffer_texts.push_back(current_easy->error_buffer);
     }
 }
 
@@ -49,8 +49,8 @@ void note(CURLoption option, void *value)
 const std::vector<CURLoption> memory_options = {CURLOPT_SSL_CTX_DATA, CURLOPT_SSL_CTX_FUNCTION,
                                                 CURLOPT_CAINFO_BLOB};
 
-easy_calls::easy_calls() { current = this; }
-easy_calls::~easy_calls() { current = nullptr; }
+easy_calls::easy_calls() { current_easy = this; }
+easy_calls::~easy_calls() { current_easy = nullptr; }
 
 std::vector<CURLoption> easy_calls::names(const std::vector<CURLoption> &without) const
 {
@@ -97,11 +97,11 @@ void watched_cleanup(CURL *handle) __asm__("__wrap_curl_easy_cleanup");
 
 CURL *watched_init()
 {
-    if (current && ++current->inits <= current->failing_inits)
+    if (current_easy && ++current_easy->inits <= current_easy->failing_inits)
         return nullptr;
     CURL *handle = real_init();
-    if (current)
-        current->handles.push_back(handle);
+    if (current_easy)
+        current_easy->handles.push_back(handle);
     return handle;
 }
 
@@ -115,21 +115,22 @@ CURLcode watched_setopt(CURL *handle, int number, ...)
     void *value = va_arg(arguments, void *);
     va_end(arguments);
     auto option = static_cast<CURLoption>(number);
-    if (current && current->refused == option)
-        return current->refusal;
-    if (current)
+    if (current_easy && current_easy->refused == option)
+        return current_easy->refusal;
+    if (current_easy)
         note(option, value);
-    if (option == CURLOPT_PORT && current && current->other_port != 0)
-        return real_setopt(handle, option, current->other_port);
+    if (option == CURLOPT_PORT && current_easy && current_easy->other_port != 0)
+        return real_setopt(handle, option, current_easy->other_port);
     return real_setopt(handle, option, value);
 }
 
 CURLcode watched_perform(CURL *handle)
 {
-    if (!current)
+    if (!current_easy)
         return real_perform(handle);
-    ++current->performances;
-    return current->perform ? current->perform(current->performances) : real_perform(handle);
+    ++current_easy->performances;
+    return current_easy->perform ? current_easy->perform(current_easy->performances)
+                                 : real_perform(handle);
 }
 
 // What receives the answer is a pointer, whatever the question.
@@ -140,10 +141,10 @@ CURLcode watched_getinfo(CURL *handle, int number, ...)
     void *answer = va_arg(arguments, void *);
     va_end(arguments);
     auto info = static_cast<CURLINFO>(number);
-    if (current && current->refused_info == info)
+    if (current_easy && current_easy->refused_info == info)
         return CURLE_UNKNOWN_OPTION;
-    if (current && current->told.count(info) > 0) {
-        *static_cast<long *>(answer) = current->told[info];
+    if (current_easy && current_easy->told.count(info) > 0) {
+        *static_cast<long *>(answer) = current_easy->told[info];
         return CURLE_OK;
     }
     return real_getinfo(handle, info, answer);
@@ -151,8 +152,8 @@ CURLcode watched_getinfo(CURL *handle, int number, ...)
 
 void watched_cleanup(CURL *handle)
 {
-    if (current)
-        ++current->cleanups;
+    if (current_easy)
+        ++current_easy->cleanups;
     real_cleanup(handle);
 }
 

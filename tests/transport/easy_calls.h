@@ -2,14 +2,26 @@
 // and fails when a test says so.
 #pragma once
 
+#include <cstdint>
 #include <functional>
 #include <map>
+#include <ostream>
 #include <string>
 #include <vector>
 
 #include <curl/curl.h>
 
 namespace quillmere_test {
+
+constexpr const char *url = "http://service.example/a/path"; // where nothing is to answer
+
+// A time-out as the library is given it, and as libcurl is.
+struct timeout_case {
+    int64_t given;
+    long used;
+};
+
+inline void PrintTo(const timeout_case &each, std::ostream *out) { *out << each.given; }
 
 // Numbers stand in number; texts and blobs, copied, in text; other pointers in pointer.
 struct easy_option {

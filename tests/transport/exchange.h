@@ -17,6 +17,9 @@ namespace quillmere_test {
 constexpr const char *path = "/a/path/of/some/length"; // to ask for where it does not matter
 constexpr const char *success = "<response><result>Success</result></response>";
 
+// What an operation says where no answer came.
+constexpr const char *no_code = "Response error: no server HTTP response code received";
+
 struct exchange {
     int64_t code;
     std::optional<std::string> body; // without a value where the response text was NULL

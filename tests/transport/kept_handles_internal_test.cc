@@ -14,8 +14,6 @@ namespace {
 using quillmere::transfer_handle;
 using testing::MatchesRegex;
 
-constexpr const char *url = "http://service.example/a/path";
-
 class KeptHandles : public testing::Test {
 protected:
     KeptHandles()

@@ -5,11 +5,6 @@
 namespace quillmere_test {
 namespace {
 
-struct timeout_case {
-    int64_t given;
-    long used; // with a default of ten seconds
-};
-
 class RequestTimeout : public library_test, public testing::WithParamInterface<timeout_case> {
 protected:
     easy_calls calls;

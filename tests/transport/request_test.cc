@@ -9,7 +9,6 @@ namespace {
 
 using testing::MatchesRegex;
 
-constexpr const char *no_code = "Response error: no server HTTP response code received";
 constexpr const char *unreadable_error = "Error parsing XML when trying to get error text";
 
 std::string unusable(int code)

@@ -1,6 +1,5 @@
 // What the upload connection asks of libcurl when it connects, and what it does when libcurl
 // refuses.
-#define CURL_DISABLE_DEPRECATION // the library asks for its socket by the older name
 #include <gmock/gmock.h>
 
 #include "support/library_fixture.h"
@@ -14,7 +13,7 @@ namespace {
 
 using testing::ElementsAre;
 
-constexpr const char *url = "https://service.example:8443/a/path";
+constexpr const char *upload_url = "https://service.example:8443/a/path";
 
 class ConnectionOptions : public library_test {
 protected:
@@ -28,12 +27,12 @@ protected:
 
 TEST_F(ConnectionOptions, StandInTheirOrderWithoutTls)
 {
-    opened result = open_connection(url, 0, 0);
+    opened result = open_connection(upload_url, 0, 0);
 
     EXPECT_EQ(result.result, 0);
     EXPECT_THAT(calls.names(), ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL,
                                            CURLOPT_TIMEOUT, CURLOPT_CONNECT_ONLY));
-    EXPECT_EQ(calls.last(CURLOPT_URL).text, url);
+    EXPECT_EQ(calls.last(CURLOPT_URL).text, upload_url);
     EXPECT_EQ(calls.last(CURLOPT_FOLLOWLOCATION).number, 1);
     EXPECT_EQ(calls.last(CURLOPT_NOSIGNAL).number, 1);
     EXPECT_EQ(calls.last(CURLOPT_CONNECT_ONLY).number, 1);
@@ -42,7 +41,7 @@ TEST_F(ConnectionOptions, StandInTheirOrderWithoutTls)
 
 TEST_F(ConnectionOptions, HavePort443AndTheCertificatesWithTls)
 {
-    open_connection(url, 1, 0);
+    open_connection(upload_url, 1, 0);
 
     EXPECT_THAT(calls.names(memory_options),
                 ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
@@ -58,7 +57,7 @@ TEST_F(ConnectionOptions, LeaveTheHostNameVerifiedWithoutCertificates)
 {
     replace_owned_text(ca_cert_pem_path.path, std::nullopt);
 
-    open_connection(url, -1, 0);
+    open_connection(upload_url, -1, 0);
 
     EXPECT_THAT(calls.names(),
                 ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
@@ -73,18 +72,13 @@ TEST_F(ConnectionOptions, AreNotChangedByTheProxyAndSslDisabled)
     proxy_server.enabled = 1;
     ssl_disabled = 1;
 
-    open_connection(url, 1, 0);
+    open_connection(upload_url, 1, 0);
 
     EXPECT_THAT(calls.names(memory_options),
                 ElementsAre(CURLOPT_URL, CURLOPT_FOLLOWLOCATION, CURLOPT_NOSIGNAL, CURLOPT_TIMEOUT,
                             CURLOPT_PORT, CURLOPT_USE_SSL, CURLOPT_SSL_SESSIONID_CACHE,
                             CURLOPT_CAINFO, CURLOPT_CONNECT_ONLY));
 }
-
-struct timeout_case {
-    int64_t given;
-    long used;
-};
 
 class ConnectionTimeout : public ConnectionOptions,
                           public testing::WithParamInterface<timeout_case> {};
@@ -93,7 +87,7 @@ TEST_P(ConnectionTimeout, IsAMinuteUnlessItIsPositiveAndKeptAsGiven)
 {
     set_default_timeout(5); // for the operations alone
 
-    opened result = open_connection(url, 0, GetParam().given);
+    opened result = open_connection(upload_url, 0, GetParam().given);
 
     EXPECT_EQ(calls.last(CURLOPT_TIMEOUT).number, GetParam().used);
     ASSERT_EQ(result.result, 0);
@@ -115,7 +109,7 @@ TEST_F(ConnectionFailure, IsALackOfMemoryForTheCertificates)
     calls.refused = CURLOPT_CAINFO; // libcurl would trust certificates of its own choice
     calls.refusal = CURLE_OUT_OF_MEMORY;
 
-    opened result = open_connection(url, 1, 5);
+    opened result = open_connection(upload_url, 1, 5);
 
     EXPECT_EQ(result.result, -1);
     EXPECT_EQ(calls.performances, 0u);
@@ -126,7 +120,7 @@ TEST_F(ConnectionFailure, OfTheHandleIsItsOwn)
 {
     calls.failing_inits = 1;
 
-    EXPECT_EQ(open_connection(url, 1, 0).result, -200);
+    EXPECT_EQ(open_connection(upload_url, 1, 0).result, -200);
 
     EXPECT_EQ(calls.performances, 0u);
     EXPECT_EQ(output.text(), "");
@@ -137,7 +131,7 @@ TEST_F(ConnectionFailure, IsPrintedAndCleanedUp)
 {
     calls.perform = [](size_t) { return CURLE_PEER_FAILED_VERIFICATION; };
 
-    EXPECT_EQ(open_connection(url, 1, 0).result, -1);
+    EXPECT_EQ(open_connection(upload_url, 1, 0).result, -1);
 
     EXPECT_EQ(calls.cleanups, 1u);
     EXPECT_EQ(output.text(), std::string("Curl error: ") +
@@ -150,7 +144,7 @@ TEST_F(ConnectionFailure, IsNotTriedAgain)
     set_connection_attempts(5);
     calls.perform = [](size_t) { return CURLE_COULDNT_CONNECT; };
 
-    open_connection(url, 1, 0);
+    open_connection(upload_url, 1, 0);
 
     EXPECT_EQ(calls.performances, 1u);
 }
@@ -159,7 +153,7 @@ TEST_F(ConnectionFailure, OfTheSocketDropsTheHandle)
 {
     calls.refused_info = CURLINFO_LASTSOCKET;
 
-    EXPECT_EQ(open_connection(url, 0, 0).result, -2);
+    EXPECT_EQ(open_connection(upload_url, 0, 0).result, -2);
 
     EXPECT_EQ(calls.cleanups, 0u);
     EXPECT_EQ(output.text(), "");
@@ -176,7 +170,7 @@ TEST_F(ConnectionClock, IsReadWhenTheConnectionStands)
 {
     socket.clock = 1'700'000'000;
 
-    opened result = open_connection(url, 0, 0);
+    opened result = open_connection(upload_url, 0, 0);
 
     ASSERT_EQ(result.result, 0);
     EXPECT_EQ(result.connection->last_transmission, 1'700'000'000);
@@ -186,7 +180,7 @@ TEST_F(ConnectionClock, LeavesTheTimeUnsetIfItCannotBeRead)
 {
     socket.clock = -1;
 
-    opened result = open_connection(url, 0, 0);
+    opened result = open_connection(upload_url, 0, 0);
 
     ASSERT_EQ(result.result, 0);
     EXPECT_EQ(result.connection->last_transmission, 0);

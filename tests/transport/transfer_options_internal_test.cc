@@ -12,8 +12,6 @@ namespace {
 using quillmere::curl_share_handle;
 using testing::ElementsAre;
 
-constexpr const char *url = "http://service.example/a/path";
-
 // Redirects are restrained besides; redirect_test.cc says how. And no TLS session is kept.
 const std::vector<CURLoption> further_options = {CURLOPT_MAXREDIRS, CURLOPT_REDIR_PROTOCOLS_STR,
                                                  CURLOPT_PREREQFUNCTION, CURLOPT_PREREQDATA,
@@ -118,22 +116,15 @@ TEST_F(TransferOptions, LeaveOutProxyCredentialsThatAreNotSet)
     EXPECT_FALSE(calls.has(CURLOPT_PROXYPASSWORD));
 }
 
-struct timeout_case {
-    int64_t argument;
-    long seconds;
-};
-
-void PrintTo(const timeout_case &each, std::ostream *out) { *out << each.argument; }
-
 class TransferTimeOut : public TransferOptions, public testing::WithParamInterface<timeout_case> {};
 
 TEST_P(TransferTimeOut, IsTheArgumentOrTheDefault)
 {
     set_default_timeout(42);
 
-    fetch(url, {nullptr, 0}, GetParam().argument);
+    fetch(url, {nullptr, 0}, GetParam().given);
 
-    EXPECT_EQ(calls.last(CURLOPT_TIMEOUT).number, GetParam().seconds);
+    EXPECT_EQ(calls.last(CURLOPT_TIMEOUT).number, GetParam().used);
 }
 
 INSTANTIATE_TEST_SUITE_P(Arguments, TransferTimeOut,

@@ -173,7 +173,7 @@ TEST_F(UpdateFile, FailsWithoutAnAnswer)
     updated result = perform({"t", "q", "n"});
 
     EXPECT_EQ(result.status, QM_NO_RESPONSE);
-    EXPECT_EQ(result.message, "Response error: no server HTTP response code received");
+    EXPECT_EQ(result.message, no_code);
     EXPECT_TRUE(hook.calls().empty());
     EXPECT_THAT(log.text(), MatchesRegex(literally("Api url:\n" + url() + "\n") + any_failure_line +
                                          literally("Got text:\n(null)\n")));

@@ -18,7 +18,7 @@ namespace {
 
 using texts = std::vector<std::string>;
 
-constexpr uint32_t untouched = 77;
+constexpr uint32_t untouched_count = 77;
 
 constexpr const char *nested_message =
     "simple_extract_changes: Attempt to create object in object!\n";
@@ -41,7 +41,7 @@ protected:
 
     log_capture log;
     change_list *changes = change_list_new();
-    uint32_t change_count = untouched;
+    uint32_t change_count = untouched_count;
 };
 
 TEST_F(Changes, ListsTheFeedInReverse)
@@ -265,7 +265,7 @@ TEST_F(Changes, TouchesNothingWithoutText)
     EXPECT_EQ(read(nullptr, 5), 0u);
     EXPECT_EQ(read("<r><file/></r>", 0), 0u);
 
-    EXPECT_EQ(change_count, untouched);
+    EXPECT_EQ(change_count, untouched_count);
     EXPECT_EQ(changes->next, nullptr);
     EXPECT_EQ(log.text(), "");
 }

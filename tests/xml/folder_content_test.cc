@@ -14,7 +14,7 @@ namespace {
 
 using texts = std::vector<std::string>;
 
-constexpr int32_t untouched = -77;
+constexpr int32_t untouched_number = -77;
 
 // Two lists of the test's own and what a reading did to them.
 class FolderContent : public testing::Test {
@@ -35,8 +35,8 @@ protected:
     log_capture log;
     file_list *files = file_info_list_new();
     folder_list *folders = folder_info_list_new();
-    int32_t file_count = untouched;
-    int32_t folder_count = untouched;
+    int32_t file_count = untouched_number;
+    int32_t folder_count = untouched_number;
 };
 
 TEST_F(FolderContent, ListsFoldersAndFilesInReverse)
@@ -260,8 +260,8 @@ TEST_F(FolderContent, TouchesNothingWithoutText)
     EXPECT_EQ(read(nullptr, 5), 0u);
     EXPECT_EQ(read("<r><file/></r>", 0), 0u);
 
-    EXPECT_EQ(file_count, untouched);
-    EXPECT_EQ(folder_count, untouched);
+    EXPECT_EQ(file_count, untouched_number);
+    EXPECT_EQ(folder_count, untouched_number);
     EXPECT_EQ(files->next, nullptr);
     EXPECT_EQ(folders->next, nullptr);
     EXPECT_EQ(log.text(), "");
