@@ -57,6 +57,6 @@ endfunction()
 # the same large templates. A source may then meet the local names of its neighbours.
 function(quillmere_unite target)
     if(QUILLMERE_UNITED_SOURCES)
-        set_target_properties(${target} PROPERTIES UNITY_BUILD ON UNITY_BUILD_BATCH_SIZE 16)
+        set_target_properties(${target} PROPERTIES UNITY_BUILD ON UNITY_BUILD_BATCH_SIZE 20)
     endif()
 endfunction()

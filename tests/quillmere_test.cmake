@@ -10,6 +10,7 @@ function(quillmere_test name)
         set(test_TIMEOUT 300) # for what hangs: no test is timed by this
     endif()
     add_executable(${name} ${test_SOURCES})
+    quillmere_unite(${name})
     target_link_libraries(${name}
         PRIVATE ${test_LIBRARIES} GTest::gtest_main quillmere_compiler_options)
     quillmere_share_precompiled_headers(${name})
@@ -19,12 +20,17 @@ endfunction()
 # quillmere_add_tests(program TIMEOUT seconds [PREFIX text])
 #
 # A process takes a sanitizer's runtime a tenth of a second to start and the counters of lines as much to write down, so
-# the builds that have these run each program as one test.
+# the builds that have these run each program as a few tests, of which none is much longer than the others.
 function(quillmere_add_tests program)
     cmake_parse_arguments(PARSE_ARGV 1 test "" "TIMEOUT;PREFIX" "")
     if(QUILLMERE_WHOLE_TEST_PROGRAMS)
-        add_test(NAME ${program} COMMAND ${program} --gtest_brief=1)
-        set_tests_properties(${program} PROPERTIES TIMEOUT 1200)
+        set(shards 4)
+        foreach(shard RANGE 1 ${shards})
+            math(EXPR index "${shard} - 1")
+            add_test(NAME ${program}.${shard} COMMAND ${program} --gtest_brief=1)
+            set_tests_properties(${program}.${shard} PROPERTIES
+                TIMEOUT 1200 ENVIRONMENT "GTEST_TOTAL_SHARDS=${shards};GTEST_SHARD_INDEX=${index}")
+        endforeach()
     else()
         # Cases go by their numbers: a printed value may hold an address, which differs from one build to the next.
         gtest_discover_tests(${program} TEST_PREFIX "${test_PREFIX}" NO_PRETTY_TYPES NO_PRETTY_VALUES
@@ -39,7 +45,8 @@ function(quillmere_share_precompiled_headers program)
         target_precompile_headers(${program} REUSE_FROM ${owner})
         get_target_property(c_sources ${program} SOURCES)
         list(FILTER c_sources INCLUDE REGEX "\\.c$")
-        set_source_files_properties(${c_sources} PROPERTIES SKIP_PRECOMPILE_HEADERS ON)
+        set_source_files_properties(${c_sources} PROPERTIES
+            SKIP_PRECOMPILE_HEADERS ON SKIP_UNITY_BUILD_INCLUSION ON)
         return()
     endif()
     set(headers gmock/gmock.h gtest/gtest.h)
