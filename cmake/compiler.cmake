@@ -37,8 +37,9 @@ if(QUILLMERE_SANITIZERS)
 endif()
 
 if(QUILLMERE_COUNT_COVERAGE)
-    # Counted by many threads at once, hence the atomic counters.
-    add_compile_options(--coverage -fprofile-update=atomic)
+    # Counted by many threads at once, hence the atomic counters. The templates of others are left out: they would be most
+    # of what each process writes down.
+    add_compile_options(--coverage -fprofile-update=atomic -fprofile-exclude-files=/usr/include/.*)
     add_link_options(--coverage)
     add_compile_definitions(QUILLMERE_COUNT_COVERAGE)
 endif()

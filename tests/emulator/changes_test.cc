@@ -248,7 +248,7 @@ TEST_F(Changes, FollowedAloneGiveWhatTheListingsShow)
     replica late{ann, 0, {}};
 
     int granted = 0;
-    for (int step = 1; granted < 2000; ++step) {
+    for (int step = 1; granted < QUILLMERE_CHANGES; ++step) {
         const bool is_ann = step % 3 != 0;
         granted += client.change(is_ann ? ann : bob, is_ann ? bob : ann) ? 1 : 0;
         if (step % 40 != 0)
