@@ -56,7 +56,7 @@ TEST_F(CriticalError, IsToldOnceAnAttempt)
     set_connection_attempts(3);
     install_event_handler(note_event, &noted);
 
-    exchange result = fetch(url);
+    exchange result = fetch(any_url);
 
     EXPECT_EQ(result.code, -1);
     EXPECT_EQ(calls.performances, 3u);
@@ -67,7 +67,7 @@ TEST_F(CriticalError, IsToldOnceAnAttempt)
 
 TEST_F(CriticalError, IsLoggedWhenNobodyWantsToKnow)
 {
-    exchange result = fetch(url);
+    exchange result = fetch(any_url);
 
     EXPECT_EQ(result.code, -1);
     EXPECT_EQ(log.text(), failure_with(documented_text) + "Detected critical error!\n");
@@ -78,7 +78,7 @@ TEST_F(CriticalError, IsNotToldToAHandlerThatWasTakenAway)
     install_event_handler(note_event, &noted);
     install_event_handler(nullptr, nullptr);
 
-    fetch(url);
+    fetch(any_url);
 
     EXPECT_TRUE(noted.event_codes.empty());
 }
@@ -89,7 +89,7 @@ TEST_F(CriticalError, IsToldToTheLatestHandlerAlone)
     install_event_handler(note_event, &noted);
     install_event_handler(note_event, &later);
 
-    fetch(url);
+    fetch(any_url);
 
     EXPECT_TRUE(noted.event_codes.empty());
     EXPECT_EQ(later.event_codes.size(), 1u);
@@ -104,7 +104,7 @@ TEST_F(CriticalError, DoesNotKeepALaterAttemptFromSucceeding)
         return performance == 1 ? fail(performance) : CURLE_OK;
     };
 
-    EXPECT_EQ(fetch(url).code, 0);
+    EXPECT_EQ(fetch(any_url).code, 0);
     EXPECT_EQ(noted.event_codes.size(), 1u);
     EXPECT_EQ(calls.performances, 2u);
 }
@@ -115,7 +115,7 @@ TEST_F(CriticalError, CannotChangeTheNumberOfAttemptsOfTheRunningCall)
     noted.attempts_from_now_on = 9;
     install_event_handler(note_event, &noted);
 
-    fetch(url);
+    fetch(any_url);
 
     EXPECT_EQ(calls.performances, 3u);
 }
@@ -128,7 +128,7 @@ TEST_P(NearlyCriticalError, IsLikeAnyOther)
     install_event_handler(note_event, &noted);
     fail_with(GetParam());
 
-    fetch(url);
+    fetch(any_url);
 
     EXPECT_TRUE(noted.event_codes.empty());
     EXPECT_EQ(log.text(), failure_with(GetParam()));
@@ -157,7 +157,7 @@ TEST_F(CriticalError, IsNothingToTheProbes)
 {
     install_event_handler(note_event, &noted);
 
-    EXPECT_EQ(check_url_response_code(url, 1000), 0);
+    EXPECT_EQ(check_url_response_code(any_url, 1000), 0);
 
     EXPECT_TRUE(noted.event_codes.empty());
     EXPECT_EQ(log.text(), failure_with(documented_text) + "Response does not match: -1\n");

@@ -13,7 +13,7 @@
 
 namespace quillmere_test {
 
-constexpr const char *url = "http://service.example/a/path"; // where nothing is to answer
+constexpr const char *any_url = "http://service.example/a/path"; // where nothing is to answer
 
 // A time-out as the library is given it, and as libcurl is.
 struct timeout_case {

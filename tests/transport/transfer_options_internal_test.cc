@@ -28,7 +28,7 @@ protected:
 
 TEST_F(TransferOptions, StandInTheirOrder)
 {
-    fetch(url);
+    fetch(any_url);
 
     EXPECT_THAT(calls.names(further_options),
                 ElementsAre(CURLOPT_SHARE, CURLOPT_DNS_CACHE_TIMEOUT, CURLOPT_ERRORBUFFER,
@@ -39,12 +39,12 @@ TEST_F(TransferOptions, StandInTheirOrder)
 
 TEST_F(TransferOptions, HaveTheirValues)
 {
-    fetch(url);
+    fetch(any_url);
 
     EXPECT_EQ(calls.last(CURLOPT_SHARE).pointer, curl_share_handle);
     EXPECT_NE(curl_share_handle, nullptr);
     EXPECT_EQ(calls.last(CURLOPT_DNS_CACHE_TIMEOUT).number, 300);
-    EXPECT_EQ(calls.last(CURLOPT_URL).text, url);
+    EXPECT_EQ(calls.last(CURLOPT_URL).text, any_url);
     EXPECT_EQ(calls.last(CURLOPT_FOLLOWLOCATION).number, 1);
     EXPECT_EQ(calls.last(CURLOPT_NOSIGNAL).number, 1);
     EXPECT_EQ(calls.last(CURLOPT_NOPROGRESS).number, 1);
@@ -61,7 +61,7 @@ TEST_F(TransferOptions, StandInTheirOrderWithEverythingConfigured)
     replace_owned_text(ca_cert_pem_path.path, std::nullopt);
     ssl_disabled = 1;
 
-    fetch(url, post_of("body"));
+    fetch(any_url, post_of("body"));
 
     EXPECT_THAT(calls.names(further_options),
                 ElementsAre(CURLOPT_SHARE, CURLOPT_DNS_CACHE_TIMEOUT, CURLOPT_ERRORBUFFER,
@@ -85,7 +85,7 @@ TEST_F(TransferOptions, LeaveTheHostNameVerifiedWithoutCertificates)
 {
     replace_owned_text(ca_cert_pem_path.path, std::nullopt);
 
-    fetch(url);
+    fetch(any_url);
 
     EXPECT_EQ(calls.last(CURLOPT_SSL_VERIFYPEER).number, 0);
     EXPECT_FALSE(calls.has(CURLOPT_SSL_VERIFYHOST));
@@ -96,7 +96,7 @@ TEST_F(TransferOptions, ShareNothingWithoutAShareHandle)
 {
     CURLSH *kept = std::exchange(curl_share_handle, nullptr);
 
-    exchange result = fetch(url);
+    exchange result = fetch(any_url);
 
     curl_share_handle = kept;
     EXPECT_EQ(result.code, 0);
@@ -109,7 +109,7 @@ TEST_F(TransferOptions, LeaveOutProxyCredentialsThatAreNotSet)
     set_user_proxy("proxy.example", 3128, nullptr, nullptr);
     proxy_server.enabled = 1;
 
-    fetch(url);
+    fetch(any_url);
 
     EXPECT_TRUE(calls.has(CURLOPT_PROXY));
     EXPECT_FALSE(calls.has(CURLOPT_PROXYUSERNAME));
@@ -122,7 +122,7 @@ TEST_P(TransferTimeOut, IsTheArgumentOrTheDefault)
 {
     set_default_timeout(42);
 
-    fetch(url, {nullptr, 0}, GetParam().given);
+    fetch(any_url, {nullptr, 0}, GetParam().given);
 
     EXPECT_EQ(calls.last(CURLOPT_TIMEOUT).number, GetParam().used);
 }
@@ -137,7 +137,7 @@ TEST_F(TransferOptions, AreSetForEveryAttemptOnAHandleOfItsOwn)
     set_connection_attempts(3);
     calls.perform = [](size_t) { return CURLE_RECV_ERROR; };
 
-    fetch(url);
+    fetch(any_url);
 
     EXPECT_EQ(calls.inits, 3u);
     EXPECT_EQ(calls.performances, 3u);
@@ -154,8 +154,8 @@ TEST_F(TransferOptions, HaveAnErrorBufferThatIsEmptiedOnceACall)
         return CURLE_RECV_ERROR;
     };
 
-    fetch(url);
-    fetch(url);
+    fetch(any_url);
+    fetch(any_url);
 
     std::string line = std::string("cUrl error: (56) ") + curl_easy_strerror(CURLE_RECV_ERROR);
     EXPECT_EQ(log.text(), line + ": what libcurl said first\n" + line +
@@ -168,7 +168,7 @@ TEST_F(TransferOptions, CountAHandleThatCannotBeMadeAsAnAttempt)
     set_connection_attempts(3);
     calls.failing_inits = 3;
 
-    EXPECT_EQ(fetch(url).code, -1);
+    EXPECT_EQ(fetch(any_url).code, -1);
 
     EXPECT_EQ(calls.inits, 3u);
     EXPECT_EQ(calls.performances, 0u);
@@ -180,7 +180,7 @@ TEST_F(TransferOptions, LetALaterHandleSucceed)
     set_connection_attempts(3);
     calls.failing_inits = 2;
 
-    EXPECT_EQ(fetch(url).code, 0);
+    EXPECT_EQ(fetch(any_url).code, 0);
 
     EXPECT_EQ(calls.inits, 3u);
     EXPECT_EQ(calls.performances, 1u);
@@ -190,7 +190,7 @@ TEST_F(TransferOptions, CountAUrlThatIsTooLongAsAttemptsWithoutALogLine)
 {
     set_connection_attempts(3);
 
-    EXPECT_EQ(fetch(url + std::string(8 * 1000 * 1000, 'a')).code, -1);
+    EXPECT_EQ(fetch(any_url + std::string(8 * 1000 * 1000, 'a')).code, -1);
 
     EXPECT_EQ(calls.inits, 3u);
     EXPECT_EQ(calls.performances, 0u);
@@ -205,7 +205,7 @@ TEST_P(RequiredOption, CountsAsAnAttemptWithoutALogLineWhenItIsRefused)
     set_connection_attempts(4);
     calls.refused = GetParam();
 
-    exchange result = fetch(url);
+    exchange result = fetch(any_url);
 
     EXPECT_EQ(result.code, -1);
     EXPECT_EQ(result.body, std::nullopt);
@@ -219,8 +219,8 @@ TEST_P(RequiredOption, FailsBothProbesWhenItIsRefused)
 {
     calls.refused = GetParam();
 
-    EXPECT_EQ(check_url_response_code(url, 1000), 0);
-    EXPECT_EQ(check_url_response(url, "q", "", 1000), 0);
+    EXPECT_EQ(check_url_response_code(any_url, 1000), 0);
+    EXPECT_EQ(check_url_response(any_url, "q", "", 1000), 0);
 
     EXPECT_EQ(calls.performances, 0u);
     EXPECT_EQ(calls.cleanups, 2u);
@@ -238,7 +238,7 @@ TEST_P(DispensableOption, DoesNotStopATransferWhenItIsRefused)
 {
     calls.refused = GetParam();
 
-    EXPECT_EQ(fetch(url, post_of("body")).code, 0);
+    EXPECT_EQ(fetch(any_url, post_of("body")).code, 0);
 
     EXPECT_EQ(calls.performances, 1u);
     EXPECT_EQ(log.text(), "");
@@ -265,7 +265,7 @@ TEST_P(ForgottenOption, FailsAnAttemptBeforeItsTransfer)
 {
     set_connection_attempts(2);
 
-    EXPECT_EQ(fetch(url).code, -1);
+    EXPECT_EQ(fetch(any_url).code, -1);
 
     EXPECT_EQ(calls.performances, 0u);
     EXPECT_EQ(calls.cleanups, 2u);
@@ -274,8 +274,8 @@ TEST_P(ForgottenOption, FailsAnAttemptBeforeItsTransfer)
 
 TEST_P(ForgottenOption, FailsBothProbesBeforeTheirTransfer)
 {
-    EXPECT_EQ(check_url_response_code(url, 1000), 0);
-    EXPECT_EQ(check_url_response(url, "q", "", 1000), 0);
+    EXPECT_EQ(check_url_response_code(any_url, 1000), 0);
+    EXPECT_EQ(check_url_response(any_url, "q", "", 1000), 0);
 
     EXPECT_EQ(calls.performances, 0u);
 }
@@ -288,7 +288,7 @@ TEST_F(TransferOptions, AreFollowedByZeroWhereNoStatusIsTold)
 {
     calls.refused_info = CURLINFO_RESPONSE_CODE;
 
-    EXPECT_EQ(fetch(url).code, 0);
+    EXPECT_EQ(fetch(any_url).code, 0);
 }
 
 class ProbeOptions : public TransferOptions {};
@@ -297,7 +297,7 @@ TEST_F(ProbeOptions, OfTheStatusStandInTheirOrder)
 {
     ssl_disabled = 1;
 
-    check_url_response_code(url, 1000);
+    check_url_response_code(any_url, 1000);
 
     EXPECT_THAT(calls.names(further_options),
                 ElementsAre(CURLOPT_SHARE, CURLOPT_DNS_CACHE_TIMEOUT, CURLOPT_ERRORBUFFER,
@@ -316,7 +316,7 @@ TEST_F(ProbeOptions, OfTheBodyStandInTheirOrder)
 {
     replace_owned_text(ca_cert_pem_path.path, std::nullopt);
 
-    check_url_response(url, "q", "", 1000);
+    check_url_response(any_url, "q", "", 1000);
 
     EXPECT_THAT(calls.names(further_options),
                 ElementsAre(CURLOPT_SHARE, CURLOPT_DNS_CACHE_TIMEOUT, CURLOPT_ERRORBUFFER,
@@ -330,7 +330,7 @@ TEST_F(ProbeOptions, MustNotBeRefusedTheLackOfABody)
 {
     calls.refused = CURLOPT_NOBODY;
 
-    EXPECT_EQ(check_url_response_code(url, 1000), 0);
+    EXPECT_EQ(check_url_response_code(any_url, 1000), 0);
 
     EXPECT_EQ(calls.performances, 0u);
     EXPECT_EQ(log.text(), "cUrl setopt failed.\nResponse does not match: -1\n");
@@ -340,8 +340,8 @@ TEST_F(ProbeOptions, NeedAHandle)
 {
     calls.failing_inits = 2;
 
-    EXPECT_EQ(check_url_response_code(url, 1000), 0);
-    EXPECT_EQ(check_url_response(url, "q", "", 1000), 0);
+    EXPECT_EQ(check_url_response_code(any_url, 1000), 0);
+    EXPECT_EQ(check_url_response(any_url, "q", "", 1000), 0);
 
     EXPECT_EQ(log.text(), "Could not initialize cUrl.\nResponse does not match: -1\n"
                           "Could not initialize cUrl.\n"
@@ -352,7 +352,7 @@ TEST_F(ProbeOptions, AreOfNoUseWithoutAStatus)
 {
     calls.refused_info = CURLINFO_RESPONSE_CODE;
 
-    EXPECT_EQ(check_url_response_code(url, 1000), 0);
+    EXPECT_EQ(check_url_response_code(any_url, 1000), 0);
 
     EXPECT_EQ(log.text(), "Response does not match: -1\n");
 }
@@ -368,10 +368,10 @@ class ProbeTimeOut : public TransferOptions, public testing::WithParamInterface<
 
 TEST_P(ProbeTimeOut, IsRoundedAwayFromZero)
 {
-    check_url_response_code(url, GetParam().milliseconds);
+    check_url_response_code(any_url, GetParam().milliseconds);
     EXPECT_EQ(calls.last(CURLOPT_TIMEOUT).number, GetParam().seconds);
 
-    check_url_response(url, "q", "", GetParam().milliseconds);
+    check_url_response(any_url, "q", "", GetParam().milliseconds);
     EXPECT_EQ(calls.last(CURLOPT_TIMEOUT).number, GetParam().seconds);
 }
 

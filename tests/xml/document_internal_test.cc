@@ -109,7 +109,7 @@ TEST_P(VeryLongDocument, IsReadAsIfInOnePieceWhenItIsCutOff)
 {
     const std::string whole = very_long_document_around(GetParam());
 
-    for (size_t missing : {1, 5})
+    for (const size_t missing : {size_t{1}, size_t{5}})
         expect_no_difference(whole.substr(0, whole.size() - missing));
 }
 
