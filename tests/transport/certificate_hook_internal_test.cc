@@ -1,5 +1,6 @@
 // How the certificates in memory get into the store of a connection: libcurl may fill that store
 // after it has called the hook, as the libcurl that is tested with does, or before.
+#include <cstdio>
 #include <memory>
 
 #include <openssl/pem.h>
@@ -90,6 +91,32 @@ class StoreFilledBefore : public CertificateHook {
 };
 
 TEST_F(StoreFilledBefore, TrustsTheCertificates) { EXPECT_EQ(fetch(secure_url).code, 0); }
+
+// The system's directory holds another root under the name of ours, and is a place to look already.
+class StoreFilledBeforeWithADirectory : public CertificateHook {
+    void perform() override
+    {
+        const certificate_authority namesake("quillmere test root");
+        const X509_NAME *name = X509_get_subject_name(namesake.root().x509());
+        char file[16];
+        std::snprintf(file, sizeof file, "%08lx.0",
+                      X509_NAME_hash_ex(name, nullptr, nullptr, nullptr));
+        const temporary_folder directory;
+        directory.write(file, namesake.root().certificate_pem());
+        fill(mark());
+        require(X509_STORE_load_path(store, directory.path().c_str()) == 1, "X509_STORE_load_path");
+        ASSERT_FALSE(trusts(loopback_certificate()));
+
+        EXPECT_EQ(call_hook(), CURLE_OK);
+
+        EXPECT_TRUE(trusts(loopback_certificate()));
+    }
+};
+
+TEST_F(StoreFilledBeforeWithADirectory, TrustsTheCertificatesFirst)
+{
+    EXPECT_EQ(fetch(secure_url).code, 0);
+}
 
 class StoreOfAProxyFilledAfterwards : public CertificateHook {
     void perform() override
