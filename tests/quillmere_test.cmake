@@ -45,6 +45,7 @@ function(quillmere_share_precompiled_headers program)
         target_precompile_headers(${program} REUSE_FROM ${owner})
         get_target_property(c_sources ${program} SOURCES)
         list(FILTER c_sources INCLUDE REGEX "\\.c$")
+        # What is united does not keep the properties of its sources.
         set_source_files_properties(${c_sources} PROPERTIES
             SKIP_PRECOMPILE_HEADERS ON SKIP_UNITY_BUILD_INCLUSION ON)
         return()

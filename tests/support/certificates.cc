@@ -9,11 +9,13 @@
 #include <openssl/x509.h>
 #include <openssl/x509v3.h>
 
+#include <cstdio>
 #include <stdexcept>
 
 namespace quillmere_test {
 namespace {
 
+constexpr const char *test_root_name = "quillmere test root";
 constexpr long hour = 3600;
 constexpr long day = 24 * hour;
 
@@ -170,8 +172,22 @@ certificate certificate_authority::issue(const leaf_request &request) const
 
 const certificate_authority &test_root()
 {
-    static const certificate_authority authority("quillmere test root");
+    static const certificate_authority authority(test_root_name);
     return authority;
+}
+
+const certificate_authority &test_root_namesake()
+{
+    static const certificate_authority authority(test_root_name);
+    return authority;
+}
+
+std::string add_to_directory(const temporary_folder &directory,
+                             const certificate_authority &authority)
+{
+    char name[16];
+    std::snprintf(name, sizeof name, "%08lx.0", X509_subject_name_hash(authority.root().x509()));
+    return directory.write(name, authority.root().certificate_pem());
 }
 
 const std::string &test_root_path()

@@ -53,6 +53,13 @@ private:
 const certificate_authority &test_root();
 const std::string &test_root_path();
 
+// Another root under the same name, which signed nothing of the test root's.
+const certificate_authority &test_root_namesake();
+
+// Puts a root where OpenSSL looks for it in a directory of certificates, and gives its path.
+std::string add_to_directory(const temporary_folder &directory,
+                             const certificate_authority &authority);
+
 // A good leaf of the test root for the loopback names, made once a process.
 const certificate &loopback_certificate();
 

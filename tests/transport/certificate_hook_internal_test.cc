@@ -1,6 +1,5 @@
 // How the certificates in memory get into the store of a connection: libcurl may fill that store
 // after it has called the hook, as the libcurl that is tested with does, or before.
-#include <cstdio>
 #include <memory>
 
 #include <openssl/pem.h>
@@ -96,13 +95,8 @@ TEST_F(StoreFilledBefore, TrustsTheCertificates) { EXPECT_EQ(fetch(secure_url).c
 class StoreFilledBeforeWithADirectory : public CertificateHook {
     void perform() override
     {
-        const certificate_authority namesake("quillmere test root");
-        const X509_NAME *name = X509_get_subject_name(namesake.root().x509());
-        char file[16];
-        std::snprintf(file, sizeof file, "%08lx.0",
-                      X509_NAME_hash_ex(name, nullptr, nullptr, nullptr));
         const temporary_folder directory;
-        directory.write(file, namesake.root().certificate_pem());
+        add_to_directory(directory, test_root_namesake());
         fill(mark());
         require(X509_STORE_load_path(store, directory.path().c_str()) == 1, "X509_STORE_load_path");
         ASSERT_FALSE(trusts(loopback_certificate()));

@@ -354,12 +354,6 @@ void PrintTo(const trial &each, std::ostream *out) { *out << each.name; }
 
 std::string root_pem() { return pem_of(test_root()); }
 
-const certificate_authority &namesake()
-{
-    static const certificate_authority authority("quillmere test root");
-    return authority;
-}
-
 const certificate &loopback() { return loopback_certificate(); }
 certificate good() { return loopback(); }
 certificate self_signed() { return self_signed_certificate(); }
@@ -376,8 +370,8 @@ const trial trials[] = {
     {"of an unknown root", certificate_of_unknown_root, root_pem, -1},
     {"self-signed", self_signed, root_pem, -1},
     {"leaf as root", good, [] { return loopback().certificate_pem(); }, 200},
-    {"two roots", good, [] { return pem_of(namesake()) + root_pem(); }, 200},
-    {"a namesake of the root", good, [] { return pem_of(namesake()); }, -1},
+    {"two roots", good, [] { return pem_of(test_root_namesake()) + root_pem(); }, 200},
+    {"a namesake of the root", good, [] { return pem_of(test_root_namesake()); }, -1},
     {"the same root twice", good, [] { return root_pem() + root_pem(); }, 200},
     {"root with its key", good, [] { return test_root().root().key_pem() + root_pem(); }, 200},
     {"text around", good, [] { return "a\n" + root_pem() + "b\n"; }, 200},
@@ -434,10 +428,7 @@ protected:
 
     std::string add(const certificate_authority &authority) const
     {
-        char name[16];
-        std::snprintf(name, sizeof name, "%08lx.0",
-                      X509_subject_name_hash(authority.root().x509()));
-        return directory.write(name, pem_of(authority));
+        return add_to_directory(directory, authority);
     }
 
     temporary_folder directory;
@@ -466,7 +457,7 @@ TEST_P(CertificateDirectory, IsNotTrustedForWhatItHeldOnce)
 
 TEST_P(CertificateDirectory, ComesAfterTheFile)
 {
-    trust(pem_of(namesake()));
+    trust(pem_of(test_root_namesake()));
     add(test_root());
 
     EXPECT_EQ(code(), -1);

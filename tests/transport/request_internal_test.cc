@@ -5,6 +5,7 @@
 namespace quillmere_test {
 namespace {
 
+// The default is ten seconds.
 class RequestTimeout : public library_test, public testing::WithParamInterface<timeout_case> {
 protected:
     easy_calls calls;
